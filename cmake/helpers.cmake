@@ -1,0 +1,32 @@
+# Small helpers for the folders' own CMakeLists.txt.
+
+# zqvissvc_sources(<variable> <glob>...): every matching source; folders need no list of files.
+function(zqvissvc_sources variable)
+  list(TRANSFORM ARGN PREPEND ${CMAKE_CURRENT_SOURCE_DIR}/)
+  file(GLOB found CONFIGURE_DEPENDS ${ARGN})
+  set(${variable} ${found} PARENT_SCOPE)
+endfunction()
+
+# zqvissvc_host_program(<target> <source>...): a program with the reference host inside. The
+# library finds the host services by name in the running program, so it must export them.
+function(zqvissvc_host_program target)
+  add_executable(${target} ${ARGN})
+  target_link_libraries(${target} PRIVATE refhost)
+  set_target_properties(${target} PROPERTIES ENABLE_EXPORTS ON)
+  target_include_directories(${target} PRIVATE ${PROJECT_BINARY_DIR}/generated)
+endfunction()
+
+# zqvissvc_static_program(<target> <source>...): the same with the whole library inside, for
+# programs that look behind the exported functions.
+function(zqvissvc_static_program target)
+  zqvissvc_host_program(${target} ${ARGN})
+  target_link_libraries(${target} PRIVATE zqvissvc_core zqvissvc_exports)
+  if(WIN32)
+    target_sources(${target} PRIVATE ${ZQVISSVC_RESOURCES})
+    target_include_directories(${target} PRIVATE ${PROJECT_SOURCE_DIR}/src)
+  endif()
+endfunction()
+
+# A source for object libraries whose folder has none yet.
+set(ZQVISSVC_EMPTY ${PROJECT_BINARY_DIR}/generated/empty.cpp)
+file(CONFIGURE OUTPUT ${ZQVISSVC_EMPTY} CONTENT "extern int zqvissvc_empty;\n")
