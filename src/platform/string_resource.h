@@ -7,9 +7,9 @@
 
 namespace zq::platform {
 
-// Copies string `id` of a module's table into `text` (at most `capacity` bytes with the terminator, cut when longer).
-// A null module is this library. Returns the length without terminator; 0 when there is no such string, and `text` is
-// then empty. Modules other than this library have tables on Windows only.
-std::size_t load_string(ModuleHandle module, unsigned id, char *text, std::size_t capacity);
+// Copies string `id` of a module's table into `text` (at most `capacity` bytes with the terminator,
+// cut when longer). A null module is this library; other modules have tables on Windows only.
+// Returns the length without terminator; 0 when there is no such string, and `text` is then empty.
+std::size_t load_string(ModuleHandle module, unsigned id, char* text, std::size_t capacity);
 
 }  // namespace zq::platform
