@@ -1,0 +1,21 @@
+// Counted strings of the host.
+#pragma once
+
+#include <zqvissvc/types.h>
+
+#include <string_view>
+
+namespace zq::host {
+
+// The bytes of a string; empty for a null handle and for a negative length. Valid until the next
+// host call.
+std::string_view view(ZqStringHandle string);
+
+// Makes *target (a null handle is given a block) hold the text, which must not lie in host memory.
+// Throws kNullPointer for a null target and kNotEnoughMemory; the string then is what it was.
+void set_string(ZqStringHandle* target, std::string_view text);
+
+// The same from another host string.
+void copy_string(ZqStringHandle* target, ZqStringHandle source);
+
+}  // namespace zq::host
