@@ -1,5 +1,6 @@
-/* Types shared by all families of the C interface: handles, host strings and arrays, the error cluster, the image
- * value and the image record. The layouts are a binary contract with hosts and sibling libraries: never change them. */
+/* Types shared by all families of the C interface: handles, host strings and arrays, the error
+ * cluster, the image value and the image record. The layouts are a binary contract with hosts and
+ * sibling libraries: never change them. */
 #ifndef ZQVISSVC_TYPES_H
 #define ZQVISSVC_TYPES_H
 
@@ -36,100 +37,103 @@ ZQ_BEGIN_C
 /* 0 is success; the library's own codes run from -1074396160 to -1074395138 (see errors.h). */
 typedef int32_t ZqError;
 
-/* A relocatable host block: a pointer to the block's address. Any host call may move the block; fetch the address
- * again after each one. */
-typedef uint8_t **ZqHandle;
+/* A relocatable host block: a pointer to the block's address. Any host call may move the block;
+ * fetch the address again after each one. */
+typedef uint8_t** ZqHandle;
 
-/* A counted host string: `length` bytes follow, without a terminator. A null handle is an empty string. */
+/* A counted host string: `length` bytes follow, without a terminator. A null handle is an empty
+ * string. */
 typedef struct ZqString {
-  int32_t length;
-  uint8_t bytes[1];
+    int32_t length;
+    uint8_t bytes[1];
 } ZqString;
-typedef ZqString **ZqStringHandle;
+typedef ZqString** ZqStringHandle;
 
 /* A one-dimensional host array of 32-bit elements; the same shape holds for every element width. */
 typedef struct ZqArrayU32 {
-  int32_t count;
-  uint32_t elements[1];
+    int32_t count;
+    uint32_t elements[1];
 } ZqArrayU32;
-typedef ZqArrayU32 **ZqArrayU32Handle;
+typedef ZqArrayU32** ZqArrayU32Handle;
 
-/* The host's error record, packed: status (1 error, 0 none) at byte 0, code at byte 1, source text at byte 5. */
+/* The host's error record, packed: status (1 error, 0 none) at byte 0, code at byte 1, source text
+ * at byte 5. */
 #pragma pack(push, 1)
 typedef struct ZqErrorCluster {
-  uint8_t status;
-  int32_t code;
-  ZqStringHandle source;
+    uint8_t status;
+    int32_t code;
+    ZqStringHandle source;
 } ZqErrorCluster;
 #pragma pack(pop)
 
 /* Pixel type codes. */
 enum {
-  ZQ_TYPE_U8 = 0,      /* unsigned 8-bit grey, 1 byte */
-  ZQ_TYPE_I16 = 1,     /* signed 16-bit grey, 2 bytes */
-  ZQ_TYPE_SGL = 2,     /* 32-bit float grey, 4 bytes */
-  ZQ_TYPE_COMPLEX = 3, /* two 32-bit floats: real, imaginary; 8 bytes */
-  ZQ_TYPE_RGB = 4,     /* bytes blue, green, red, alpha; 4 bytes */
-  ZQ_TYPE_HSL = 5,     /* bytes luminance, saturation, hue, alpha; 4 bytes */
-  ZQ_TYPE_RGBU64 = 6   /* unsigned 16-bit blue, green, red, alpha; 8 bytes */
+    ZQ_TYPE_U8 = 0,      /* unsigned 8-bit grey, 1 byte */
+    ZQ_TYPE_I16 = 1,     /* signed 16-bit grey, 2 bytes */
+    ZQ_TYPE_SGL = 2,     /* 32-bit float grey, 4 bytes */
+    ZQ_TYPE_COMPLEX = 3, /* two 32-bit floats: real, imaginary; 8 bytes */
+    ZQ_TYPE_RGB = 4,     /* bytes blue, green, red, alpha; 4 bytes */
+    ZQ_TYPE_HSL = 5,     /* bytes luminance, saturation, hue, alpha; 4 bytes */
+    ZQ_TYPE_RGBU64 = 6   /* unsigned 16-bit blue, green, red, alpha; 8 bytes */
 };
 
 /* Bookkeeping of an image's buffer. */
 typedef struct ZqMemoryRecord {
-  uint32_t words[3];
-  uint8_t physical; /* 1: the buffer came from the physical-memory allocator */
-  uint8_t padding[3];
+    uint32_t words[3];
+    uint8_t physical; /* 1: the buffer came from the physical-memory allocator */
+    uint8_t padding[3];
 } ZqMemoryRecord;
 
-/* The image record. A handle points at it; the object's table of operations lies in front of it. Fields may be read
- * while the image is locked; only the library writes them, except unit, xStep and yStep, which a client may set. */
+/* The image record. A handle points at it; the object's table of operations lies in front of it.
+ * Fields may be read while the image is locked; only the library writes them, except unit, xStep
+ * and yStep, which a client may set. */
 typedef struct ZqImageRecord {
-  int32_t unit;         /* calibration unit code */
-  float xStep;          /* width of one pixel in that unit */
-  float yStep;          /* height of one pixel in that unit */
-  int32_t type;         /* ZQ_TYPE_... */
-  int32_t width;        /* pixels per row, without border */
-  int32_t height;       /* rows, without border */
-  int32_t reserved[2];  /* 0 */
-  int32_t border;       /* pixels on each of the four sides */
-  int32_t rowPixels;    /* pixels from one row to the next, border and padding included */
-  uint8_t *buffer;      /* start of the allocation, or the caller's external buffer */
-  void *extraInfo;      /* owned attachment, or null */
-  uint8_t *firstPixel;  /* pixel (0, 0); null when there are no pixels */
-  char *name;           /* owned, zero-terminated; null when unnamed */
-  uint32_t reserved2;   /* 0 */
-  uint32_t greedySize;  /* largest size asked of a greedy image's buffer; 0xFFFFFFFF: not greedy */
-  uint32_t words[2];    /* 0 */
-  void *customData;     /* owned keyed collection of attachments */
-  uint32_t hostCookie;  /* cookie of the host session; 0: none */
-  ZqMemoryRecord *memoryInfo;
+    int32_t unit;        /* calibration unit code */
+    float xStep;         /* width of one pixel in that unit */
+    float yStep;         /* height of one pixel in that unit */
+    int32_t type;        /* ZQ_TYPE_... */
+    int32_t width;       /* pixels per row, without border */
+    int32_t height;      /* rows, without border */
+    int32_t reserved[2]; /* 0 */
+    int32_t border;      /* pixels on each of the four sides */
+    int32_t rowPixels;   /* pixels from one row to the next, border and padding included */
+    uint8_t* buffer;     /* start of the allocation, or the caller's external buffer */
+    void* extraInfo;     /* owned attachment, or null */
+    uint8_t* firstPixel; /* pixel (0, 0); null when there are no pixels */
+    char* name;          /* owned, zero-terminated; null when unnamed */
+    uint32_t reserved2;  /* 0 */
+    uint32_t greedySize; /* largest size asked of a greedy image's buffer; 0xFFFFFFFF: not greedy */
+    uint32_t words[2];   /* 0 */
+    void* customData;    /* owned keyed collection of attachments */
+    uint32_t hostCookie; /* cookie of the host session; 0: none */
+    ZqMemoryRecord* memoryInfo;
 } ZqImageRecord;
-typedef ZqImageRecord *ZqImageHandle;
+typedef ZqImageRecord* ZqImageHandle;
 
 /* The host's image value. Hosts copy it freely; all copies mean the same image. */
 typedef struct ZqImageValue {
-  ZqStringHandle name; /* empty for an unnamed image */
-  ZqImageHandle image;
+    ZqStringHandle name; /* empty for an unnamed image */
+    ZqImageHandle image;
 } ZqImageValue;
 
 /* Rectangles of the C environment, in pixels. */
 typedef struct ZqRect {
-  int32_t left, top, width, height;
+    int32_t left, top, width, height;
 } ZqRect;
 typedef struct ZqCoordinates {
-  int32_t left, top, right, bottom; /* right and bottom exclusive */
+    int32_t left, top, right, bottom; /* right and bottom exclusive */
 } ZqCoordinates;
 
 /* A 16-byte class identifier in memory order. */
 typedef struct ZqClassId {
-  uint32_t data1;
-  uint16_t data2;
-  uint16_t data3;
-  uint8_t data4[8];
+    uint32_t data1;
+    uint16_t data2;
+    uint16_t data3;
+    uint8_t data4[8];
 } ZqClassId;
 
 #define ZQ_ASSERT_OFFSET(type, field, offset) \
-  ZQ_STATIC_ASSERT(offsetof(type, field) == (offset), #type "." #field " moved")
+    ZQ_STATIC_ASSERT(offsetof(type, field) == (offset), #type "." #field " moved")
 
 ZQ_ASSERT_OFFSET(ZqErrorCluster, status, 0);
 ZQ_ASSERT_OFFSET(ZqErrorCluster, code, 1);

@@ -1,51 +1,53 @@
-// Error codes of the library. Inside, a failure is thrown as one of these values; the exported boundary returns it.
+// Error codes of the library. Inside, a failure is thrown as one of these values; the exported
+// boundary returns it.
 #pragma once
 
 #include <cstdint>
 
-// NOLINTNEXTLINE(readability-identifier-naming): the name is part of the contract with sibling libraries.
+// NOLINTNEXTLINE(readability-identifier-naming): the name is part of the contract with sibling
+// libraries.
 enum GRLIBError_enum : std::int32_t {
-  kSuccess = 0,
-  kSystemError = -1074396160,
-  kNotEnoughMemory = -1074396159,
-  kMemoryError = -1074396158,
-  kNotInitialized = -1074396155,
-  kImageTooSmall = -1074396154,
-  kPoolExhausted = -1074396139,
-  kNotAnImage = -1074396120,
-  kNotAnObject = -1074396096,
-  kPoolInUse = -1074396092,
-  kPoolMissing = -1074396091,
-  kPoolEnabled = -1074396090,
-  kPoolExists = -1074396089,
-  kPaletteNeeds8Bit = -1074396082,
-  kInvalidImageType = -1074396080,
-  kIncompatibleImageType = -1074396077,
-  kIncompatibleImageSize = -1074396074,
-  kImageLent = -1074396065,
-  kExternalBufferAlignment = -1074396063,
-  kInvalidFileHeader = -1074396000,
-  kInvalidParameter = -1074395997,
-  kFileNotFound = -1074395995,
-  kTooManyFilesOpen = -1074395994,
-  kFileIo = -1074395993,
-  kFileAccessDenied = -1074395992,
-  kUnsupportedFileType = -1074395991,
-  kUnableToReadData = -1074395989,
-  kUnableToWriteData = -1074395988,
-  kDiskFull = -1074395983,
-  kPaletteSize = -1074395976,
-  kBitDepth = -1074395721,
-  kValueNotInEnumeration = -1074395713,
-  kNullPointer = -1074395269,
-  kInvalidCoordinate = -1074395261,
-  // The older family of the buffer-level file functions.
-  kBufferNotEnoughMemory = -1074397181,  // 0xBFF60003
-  kBufferNullPath = -1074397179,         // 0xBFF60005
-  kBufferNullBuffer = -1074397178,       // 0xBFF60006
-  kBufferReadFailed = -1074397177,       // 0xBFF60007
-  kBufferKind = -1074397114,             // 0xBFF60046
-  kBufferExtension = -1074397113,        // 0xBFF60047
-  kBufferMode = -1074397106,             // 0xBFF6004E
-  kBufferWriteFailed = -1074397104,      // 0xBFF60050
+    kSuccess = 0,
+    kSystemError = -1074396160,
+    kNotEnoughMemory = -1074396159,
+    kMemoryError = -1074396158,
+    kNotInitialized = -1074396155,
+    kImageTooSmall = -1074396154,
+    kPoolExhausted = -1074396139,
+    kNotAnImage = -1074396120,
+    kNotAnObject = -1074396096,
+    kPoolInUse = -1074396092,
+    kPoolMissing = -1074396091,
+    kPoolEnabled = -1074396090,
+    kPoolExists = -1074396089,
+    kPaletteNeeds8Bit = -1074396082,
+    kInvalidImageType = -1074396080,
+    kIncompatibleImageType = -1074396077,
+    kIncompatibleImageSize = -1074396074,
+    kImageLent = -1074396065,
+    kExternalBufferAlignment = -1074396063,
+    kInvalidFileHeader = -1074396000,
+    kInvalidParameter = -1074395997,
+    kFileNotFound = -1074395995,
+    kTooManyFilesOpen = -1074395994,
+    kFileIo = -1074395993,
+    kFileAccessDenied = -1074395992,
+    kUnsupportedFileType = -1074395991,
+    kUnableToReadData = -1074395989,
+    kUnableToWriteData = -1074395988,
+    kDiskFull = -1074395983,
+    kPaletteSize = -1074395976,
+    kBitDepth = -1074395721,
+    kValueNotInEnumeration = -1074395713,
+    kNullPointer = -1074395269,
+    kInvalidCoordinate = -1074395261,
+    // The older family of the buffer-level file functions.
+    kBufferNotEnoughMemory = -1074397181,  // 0xBFF60003
+    kBufferNullPath = -1074397179,         // 0xBFF60005
+    kBufferNullBuffer = -1074397178,       // 0xBFF60006
+    kBufferReadFailed = -1074397177,       // 0xBFF60007
+    kBufferKind = -1074397114,             // 0xBFF60046
+    kBufferExtension = -1074397113,        // 0xBFF60047
+    kBufferMode = -1074397106,             // 0xBFF6004E
+    kBufferWriteFailed = -1074397104,      // 0xBFF60050
 };

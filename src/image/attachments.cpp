@@ -1,0 +1,77 @@
+// The circular list of attachments.
+#include "image/attachments.h"
+
+#include <utility>
+
+namespace zq {
+
+struct AttachmentList::Node : Link {
+    ClassId id;
+    std::unique_ptr<Attachment> attachment;
+};
+
+AttachmentList::AttachmentList() {
+    static_assert(sizeof(Head) == 4 * sizeof(void*));
+    head_.next = &head_;
+    head_.previous = &head_;
+    head_.count = 0;
+    head_.reserved = 0;
+}
+
+AttachmentList::~AttachmentList() {
+    clear();
+}
+
+AttachmentList::Node* AttachmentList::find_node(const ClassId& id) const {
+    for (Link* link = head_.next; link != &head_; link = link->next) {
+        auto* node = static_cast<Node*>(link);
+        if (same_class(node->id, id)) {
+            return node;
+        }
+    }
+    return nullptr;
+}
+
+void AttachmentList::set(const ClassId& id, std::unique_ptr<Attachment> attachment) {
+    if (Node* node = find_node(id)) {
+        node->attachment = std::move(attachment);
+        return;
+    }
+    auto node = std::make_unique<Node>();
+    node->id = id;
+    node->attachment = std::move(attachment);
+    node->next = &head_;
+    node->previous = head_.previous;
+    head_.previous->next = node.get();
+    head_.previous = node.release();
+    ++head_.count;
+}
+
+Attachment* AttachmentList::find(const ClassId& id) const {
+    const Node* node = find_node(id);
+    return node == nullptr ? nullptr : node->attachment.get();
+}
+
+bool AttachmentList::remove(const ClassId& id) {
+    Node* node = find_node(id);
+    if (node == nullptr) {
+        return false;
+    }
+    erase(node);
+    return true;
+}
+
+void AttachmentList::clear() {
+    while (head_.next != &head_) {
+        erase(static_cast<Node*>(head_.next));
+    }
+}
+
+void AttachmentList::erase(Node* node) {
+    const std::unique_ptr<Node> owner(node);
+    node->previous->next = node->next;
+    node->next->previous = node->previous;
+    --head_.count;
+}
+
+}  // namespace zq

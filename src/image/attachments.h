@@ -1,0 +1,61 @@
+// What clients hang on an image: the keyed collection of attachment objects and the extra
+// information.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+
+#include "image/class_id.h"
+
+namespace zq {
+
+// An object owned by an image's collection.
+class Attachment {
+  public:
+    virtual ~Attachment() = default;
+};
+
+// Extra information: one object a image that holds parts of several kinds.
+class ImageExtraInfo {
+  public:
+    virtual ~ImageExtraInfo() = default;
+    // Drops the part of this kind; nothing happens when there is none.
+    virtual void remove_kind(std::int32_t kind) = 0;
+};
+
+// A circular list with one entry a class. Threads: the image's lock.
+class AttachmentList {
+  public:
+    AttachmentList();
+    ~AttachmentList();
+    AttachmentList(const AttachmentList&) = delete;
+    AttachmentList& operator=(const AttachmentList&) = delete;
+
+    // Takes the object; one of the same class that was there is destroyed.
+    void set(const ClassId& id, std::unique_ptr<Attachment> attachment);
+    // Borrowed; null when absent.
+    Attachment* find(const ClassId& id) const;
+    // False when absent.
+    bool remove(const ClassId& id);
+    void clear();
+    // What `image->customData` points at.
+    void* head() { return &head_; }
+
+  private:
+    struct Link {
+        Link* next;
+        Link* previous;
+    };
+    struct Node;
+    // Four machine words; 16 bytes in a 32-bit process.
+    struct Head : Link {
+        std::uintptr_t count;
+        std::uintptr_t reserved;
+    };
+    Node* find_node(const ClassId& id) const;
+    void erase(Node* node);
+    Head head_;
+};
+
+}  // namespace zq

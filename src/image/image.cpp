@@ -1,0 +1,109 @@
+// The image object: description, pixels' addresses, lending, attributes. Changes of shape are in
+// image_shape.cpp.
+#include "image/image.h"
+
+#include <cstddef>
+#include <cstring>
+#include <limits>
+
+namespace zq {
+
+namespace {
+
+char* copy_name(std::string_view name) {
+    if (name.empty()) {
+        return nullptr;
+    }
+    auto copy = std::make_unique<char[]>(name.size() + 1);
+    std::memcpy(copy.get(), name.data(), name.size());
+    return copy.release();
+}
+
+}  // namespace
+
+Image::Image(Variant variant, std::string_view name)
+    : gate_(std::make_shared<ObjectGate>(variant == Variant::kRegistered)), variant_(variant) {
+#pragma GCC diagnostic push
+#pragma GCC diagnostic ignored "-Winvalid-offsetof"
+    static_assert(offsetof(Image, record_) == sizeof(void*));
+#pragma GCC diagnostic pop
+    record_.xStep = 1.0F;
+    record_.yStep = 1.0F;
+    record_.greedySize = kNotGreedy;
+    record_.customData = attachments_.head();
+    record_.memoryInfo = &memory_record_;
+    record_.name = copy_name(name);
+}
+
+Image::~Image() {
+    if (external_count_ > 0 && source_ != BufferSource::kExternal) {
+        try {
+            LentBuffers::instance().adopt(record_.buffer, source_, external_count_);
+        } catch (...) {
+            // Out of memory: the buffer is lost rather than freed under its user.
+            source_ = BufferSource::kNone;
+        }
+    } else {
+        release_buffer();
+    }
+    delete extra_info();
+    delete[] record_.name;
+}
+
+std::string_view Image::name() const {
+    return record_.name == nullptr ? std::string_view() : record_.name;
+}
+
+std::uint8_t* Image::pixel(std::int32_t x, std::int32_t y) const {
+    if (record_.firstPixel == nullptr) {
+        throw kImageTooSmall;
+    }
+    const std::int64_t border = record_.border;
+    if (x < -border || x >= record_.width + border || y < -border || y >= record_.height + border) {
+        throw kInvalidCoordinate;
+    }
+    return row(y) + std::ptrdiff_t{x} * bytes_per_pixel(type());
+}
+
+std::uint8_t* Image::lend() {
+    if (external_count_ == std::numeric_limits<std::int32_t>::max()) {
+        throw kSystemError;
+    }
+    ++external_count_;
+    return record_.buffer;
+}
+
+void Image::give_back() {
+    if (external_count_ > 0) {
+        --external_count_;
+    }
+}
+
+void Image::refuse_when_lent() const {
+    if (external_count_ > 0) {
+        throw kImageLent;
+    }
+}
+
+void Image::set_bit_depth(std::int32_t bits) {
+    if (bits != 0 && (bits < 8 || bits > 16 || !has_bit_depth(type()))) {
+        throw kBitDepth;
+    }
+    bit_depth_ = bits;
+}
+
+void Image::set_extra_info(std::unique_ptr<ImageExtraInfo> extra) {
+    delete extra_info();
+    record_.extraInfo = extra.release();
+}
+
+void Image::drop_geometry_attachments() {
+    if (ImageExtraInfo* extra = extra_info()) {
+        extra->remove_kind(2);
+        extra->remove_kind(3);
+    }
+    attachments_.remove(kGeometryAttachment1);
+    attachments_.remove(kGeometryAttachment2);
+}
+
+}  // namespace zq

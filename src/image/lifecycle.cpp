@@ -1,0 +1,103 @@
+// Find-or-create and disposal on top of the registry.
+#include "image/lifecycle.h"
+
+#include <array>
+#include <atomic>
+#include <functional>
+#include <memory>
+
+#include "image/image_lock.h"
+#include "image/registry.h"
+
+namespace zq {
+
+namespace {
+
+std::array<std::atomic<DisposeListener>, 4> listeners{};
+
+class ImageHandler final : public ObjectHandler {
+  public:
+    void release_resources(Object& object) noexcept override {
+        for (const auto& listener : listeners) {
+            if (const DisposeListener call = listener.load()) {
+                call(static_cast<Image&>(object));
+            }
+        }
+    }
+    void destroy(Object* object) noexcept override { delete object; }
+};
+
+ImageHandler image_handler;
+
+using Shaper = std::function<void(Image&)>;
+
+// Shapes the image that has the name, under its lock; null when there is none, or it went away
+// meanwhile.
+ImageHandle reshape_existing(std::string_view name, const Shaper& shape) {
+    const Pin pin = Registry::instance().find(name, kImageTag);
+    if (!pin || !pin.gate->lock()) {
+        return nullptr;
+    }
+    const std::unique_ptr<ObjectGate, void (*)(ObjectGate*)> unlock(
+        pin.gate.get(), [](ObjectGate* gate) { gate->unlock(); });
+    auto* image = static_cast<Image*>(pin.object);
+    shape(*image);
+    return image->handle();
+}
+
+ImageHandle find_or_create(std::string_view name, Variant variant, const Shaper& shape) {
+    for (;;) {
+        if (const ImageHandle found = reshape_existing(name, shape)) {
+            return found;
+        }
+        auto image = std::make_unique<Image>(variant, name);
+        shape(*image);
+        const ImageHandle handle = image->handle();
+        std::unique_ptr<Object> object = std::move(image);
+        // Another thread may have registered the name since; then its image is the one to take.
+        if (Registry::instance().add(object, image_handler, kImageTag, name, !name.empty())) {
+            return handle;
+        }
+    }
+}
+
+}  // namespace
+
+ImageHandle new_image(const ImageShape& shape) {
+    return new_named_image(shape, {}, Variant::kRegistered);
+}
+
+ImageHandle new_named_image(const ImageShape& shape, std::string_view name, Variant variant) {
+    return find_or_create(name, variant, [&shape](Image& image) { image.reinitialise(shape); });
+}
+
+ImageHandle new_external_image(const ImageShape& shape, std::uint8_t* buffer,
+                               std::int32_t row_pixels, std::string_view name) {
+    return find_or_create(name, Variant::kRegistered,
+                          [&](Image& image) { image.wrap_external(shape, buffer, row_pixels); });
+}
+
+void dispose_image(ImageHandle handle) {
+    if (handle == nullptr) {
+        return;
+    }
+    const std::uintptr_t address = Image::object_address(handle);
+    if (const Pin pin = Registry::instance().pin(address); pin && pin.tag == kImageTag) {
+        Registry::instance().dispose(address);
+    }
+}
+
+void dispose_all_images() {
+    Registry::instance().dispose_all(kImageTag);
+}
+
+void add_dispose_listener(DisposeListener listener) {
+    for (auto& place : listeners) {
+        DisposeListener expected = nullptr;
+        if (place.load() == listener || place.compare_exchange_strong(expected, listener)) {
+            return;
+        }
+    }
+}
+
+}  // namespace zq

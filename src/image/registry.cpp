@@ -1,0 +1,265 @@
+// Slots, their state protocol and the index beside them.
+#include "image/registry.h"
+
+#include <algorithm>
+#include <array>
+#include <atomic>
+#include <mutex>
+#include <utility>
+
+#include "image/lent_buffers.h"
+#include "image/memory_pool.h"
+#include "image/physical_memory.h"
+#include "platform/thread.h"
+
+namespace zq {
+
+namespace {
+
+constexpr std::uint32_t kSlotsPerBlock = 32;
+
+constexpr std::uint32_t kHeld = 0;
+constexpr std::uint32_t kFree = 1;
+constexpr std::uint32_t kOccupied = 2;
+constexpr std::uint32_t kDestroying = 4;
+
+}  // namespace
+
+struct Registry::Slot {
+    Object* object = nullptr;
+    ObjectHandler* handler = nullptr;
+    std::int32_t tag = kAnyTag;
+    std::uint32_t word = 0;
+    std::atomic<std::uint32_t> state = kFree;
+    std::string name;  // empty for an unnamed object
+};
+
+struct Registry::Block {
+    std::array<Slot, kSlotsPerBlock> slots;
+    Block* next = nullptr;
+};
+
+// Holds a slot for examination and puts a state back at the end: the one found, or the one set
+// meanwhile.
+class Registry::SlotHold {
+  public:
+    explicit SlotHold(Slot& slot) : slot_(slot) {
+        while ((state_ = slot_.state.exchange(kHeld)) == kHeld) {
+            platform::pause_spin();
+        }
+    }
+    ~SlotHold() { slot_.state.exchange(state_); }
+    SlotHold(const SlotHold&) = delete;
+    SlotHold& operator=(const SlotHold&) = delete;
+
+    std::uint32_t state() const { return state_; }
+    void set_state(std::uint32_t state) { state_ = state; }
+
+  private:
+    Slot& slot_;
+    std::uint32_t state_;
+};
+
+Registry& Registry::instance() {
+    static Registry the_registry;
+    return the_registry;
+}
+
+Registry::Registry() {
+    // Made before the registry, these outlive it: the images that are left at the end still need
+    // them.
+    MemoryPool::instance();
+    PhysicalMemory::instance();
+    LentBuffers::instance();
+}
+
+Registry::~Registry() {
+    for (const auto& block : blocks_) {
+        for (Slot& slot : block->slots) {
+            if (slot.object != nullptr) {
+                slot.handler->destroy(std::exchange(slot.object, nullptr));
+            }
+        }
+    }
+}
+
+Registry::Slot& Registry::slot_at(Ordinal ordinal) {
+    return blocks_[ordinal / kSlotsPerBlock]->slots[ordinal % kSlotsPerBlock];
+}
+
+void Registry::append_block() {
+    const auto first = static_cast<Ordinal>(blocks_.size()) * kSlotsPerBlock;
+    // Room for every slot, so that freeing one never needs memory.
+    free_.reserve(first + kSlotsPerBlock);
+    blocks_.push_back(std::make_unique<Block>());
+    if (blocks_.size() > 1) {
+        blocks_[blocks_.size() - 2]->next = blocks_.back().get();
+    }
+    for (Ordinal ordinal = first; ordinal < first + kSlotsPerBlock; ++ordinal) {
+        free_slot(ordinal);
+    }
+}
+
+Registry::Ordinal Registry::take_free_slot() {
+    std::pop_heap(free_.begin(), free_.end(), std::greater<>());
+    const Ordinal ordinal = free_.back();
+    free_.pop_back();
+    return ordinal;
+}
+
+void Registry::free_slot(Ordinal ordinal) {
+    free_.push_back(ordinal);
+    std::push_heap(free_.begin(), free_.end(), std::greater<>());
+}
+
+bool Registry::add(std::unique_ptr<Object>& object, ObjectHandler& handler, std::int32_t tag,
+                   std::string_view name, bool unique) {
+    const auto address = reinterpret_cast<std::uintptr_t>(object.get());
+    std::string name_copy(name);
+    const std::lock_guard lock(index_);
+    if (unique && find_indexed(name, tag)) {
+        return false;
+    }
+    if (free_.empty()) {
+        append_block();
+    }
+    const Ordinal ordinal = free_.front();
+    const auto position = positions_.emplace(address, ordinal).first;
+    try {
+        index_name(name, ordinal);
+    } catch (...) {
+        positions_.erase(position);
+        throw;
+    }
+    take_free_slot();
+    Slot& slot = slot_at(ordinal);
+    SlotHold hold(slot);
+    slot.object = object.release();
+    slot.handler = &handler;
+    slot.tag = tag;
+    slot.word = 0;
+    slot.name = std::move(name_copy);
+    hold.set_state(kOccupied);
+    return true;
+}
+
+void Registry::index_name(std::string_view name, Ordinal ordinal) {
+    if (name.empty()) {
+        return;
+    }
+    auto found = names_.find(name);
+    if (found == names_.end()) {
+        names_.emplace(std::string(name), std::vector<Ordinal>{ordinal});
+        return;
+    }
+    std::vector<Ordinal>& ordinals = found->second;
+    ordinals.insert(std::upper_bound(ordinals.begin(), ordinals.end(), ordinal), ordinal);
+}
+
+void Registry::forget_name(std::string_view name, Ordinal ordinal) {
+    const auto found = names_.find(name);
+    if (found == names_.end()) {
+        return;
+    }
+    std::erase(found->second, ordinal);
+    if (found->second.empty()) {
+        names_.erase(found);
+    }
+}
+
+Pin Registry::examine(Ordinal ordinal, std::int32_t tag) {
+    Slot& slot = slot_at(ordinal);
+    const SlotHold hold(slot);
+    if (hold.state() != kOccupied || (tag != kAnyTag && slot.tag != tag)) {
+        return {};
+    }
+    return {slot.object, slot.tag, slot.object->gate()};
+}
+
+Pin Registry::find_indexed(std::string_view name, std::int32_t tag) {
+    const auto found = names_.find(name);
+    if (found != names_.end()) {
+        for (const Ordinal ordinal : found->second) {
+            if (Pin pin = examine(ordinal, tag)) {
+                return pin;
+            }
+        }
+    }
+    return {};
+}
+
+Pin Registry::find(std::string_view name, std::int32_t tag) {
+    const std::lock_guard lock(index_);
+    return find_indexed(name, tag);
+}
+
+Pin Registry::pin(std::uintptr_t address) {
+    const std::lock_guard lock(index_);
+    const auto found = positions_.find(address);
+    return found == positions_.end() ? Pin{} : examine(found->second, kAnyTag);
+}
+
+bool Registry::dispose(std::uintptr_t address) {
+    Ordinal ordinal = 0;
+    std::shared_ptr<ObjectGate> gate;
+    {
+        const std::lock_guard removal(removal_);
+        const std::lock_guard lock(index_);
+        const auto found = positions_.find(address);
+        if (found == positions_.end()) {
+            return false;
+        }
+        ordinal = found->second;
+        positions_.erase(found);
+        Slot& slot = slot_at(ordinal);
+        forget_name(slot.name, ordinal);
+        gate = slot.object->gate();
+    }
+    destroy_slot(ordinal, gate);
+    return true;
+}
+
+// Nobody finds the slot any more; those who found it before wait at the gate or hold it.
+void Registry::destroy_slot(Ordinal ordinal, const std::shared_ptr<ObjectGate>& gate) {
+    gate->close();
+    Slot* slot = nullptr;
+    {
+        const std::lock_guard lock(index_);
+        slot = &slot_at(ordinal);
+    }
+    { SlotHold(*slot).set_state(kDestroying); }
+    slot->handler->release_resources(*slot->object);
+    slot->handler->destroy(std::exchange(slot->object, nullptr));
+    slot->name.clear();
+    const std::lock_guard lock(index_);
+    SlotHold(*slot).set_state(kFree);
+    free_slot(ordinal);
+}
+
+bool Registry::next_of_kind(std::int32_t tag, Ordinal& from, std::uintptr_t& address) {
+    const std::lock_guard lock(index_);
+    const auto end = static_cast<Ordinal>(blocks_.size()) * kSlotsPerBlock;
+    for (; from < end; ++from) {
+        if (const Pin pin = examine(from, tag)) {
+            address = reinterpret_cast<std::uintptr_t>(pin.object);
+            ++from;
+            return true;
+        }
+    }
+    return false;
+}
+
+void Registry::dispose_all(std::int32_t tag) {
+    Ordinal from = 0;
+    std::uintptr_t address = 0;
+    while (next_of_kind(tag, from, address)) {
+        dispose(address);
+    }
+}
+
+std::size_t Registry::live_count() {
+    const std::lock_guard lock(index_);
+    return positions_.size();
+}
+
+}  // namespace zq
