@@ -176,5 +176,5 @@ if begin openjpeg2; then
         >>"$(echo "$prefix"/lib/openjpeg-*/OpenJPEGTargets.cmake)"
     finish lib/libopenjp2.a
 fi
-rm -rf "$work" "$prefix"/bin "$prefix"/share/{doc,man}   # tools and manuals are of no use here
+rm -rf "$work" "${prefix:?}"/{bin,share/doc,share/man}   # tools and manuals are of no use here
 say "all libraries are in $prefix"

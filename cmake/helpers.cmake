@@ -8,11 +8,14 @@ function(zqvissvc_sources variable)
 endfunction()
 
 # zqvissvc_host_program(<target> <source>...): a program with the reference host inside. The
-# library finds the host services by name in the running program, so it must export them.
+# library finds the host services by name in the running program, so it must export them; on
+# Windows the host's own declarations do that.
 function(zqvissvc_host_program target)
   add_executable(${target} ${ARGN})
   target_link_libraries(${target} PRIVATE refhost)
-  set_target_properties(${target} PROPERTIES ENABLE_EXPORTS ON)
+  if(NOT WIN32)
+    set_target_properties(${target} PROPERTIES ENABLE_EXPORTS ON)
+  endif()
   target_include_directories(${target} PRIVATE ${PROJECT_BINARY_DIR}/generated)
 endfunction()
 
