@@ -18,6 +18,14 @@ typedef struct ZqPoint {
 } ZqPoint;
 typedef void(ZQ_CALL* ZqColorProc)(void); /* the host casts it to the type that it calls */
 
+/* Signatures that several slots share, or that the library calls. Unnamed values are the host's. */
+typedef void(ZQ_CALL* ZqDrawSBarProc)(ZqPort*, int32_t, int32_t, int32_t, int32_t, void*, void*,
+                                      int32_t, int32_t);
+typedef int32_t(ZQ_CALL* ZqTrackSBarEventProc)(ZqPort*, ZqPoint, int32_t, int32_t, int32_t, int32_t,
+                                               void*, void*, int32_t, int32_t);
+typedef int32_t(ZQ_CALL* ZqMenuItemProc)(ZqBaseMenu* menu, int32_t item);
+typedef int32_t(ZQ_CALL* ZqFiveValuesProc)(int32_t, int32_t, int32_t, int32_t, int32_t);
+
 /* ---- Callback slots: variables that the host may set before other threads enter the library.
  * Null: the host does not offer the service. The bound ones start as functions that find the host's
  * function of the same name when they are called, and tell the user in a message box when there is
@@ -32,19 +40,15 @@ extern ZQ_DATA ZqNewHandleProc AZNewHandle_EX;
 extern ZQ_DATA ZqSetHandleSizeProc AZSetHandleSize_EX;
 extern ZQ_DATA ZqGetHandleSizeProc AZGetHandleSize_EX;
 extern ZQ_DATA ZqDisposeHandleProc AZDisposeHandle_EX;
-extern ZQ_DATA int(ZQ_CALL* DSDisposeHandle_EX)(
-    void** handle); /* the handle itself, whatever it holds */
+/* Takes the handle itself, whatever it holds. */
+extern ZQ_DATA int(ZQ_CALL* DSDisposeHandle_EX)(void** handle);
 extern ZQ_DATA ZqMoveBlockProc MoveBlock_EX;
 extern ZQ_DATA ZqStrLenProc StrLen_EX;
 extern ZQ_DATA ZqCToPStrProc CToPStr_EX;
 extern ZQ_DATA ZqTextToPathProc FTextToPath_EX;
 extern ZQ_DATA ZqEmptyPathProc FEmptyPath_EX;
 extern ZQ_DATA ZqAddPathProc FAddPath_EX;
-typedef void(ZQ_CALL* ZqDrawSBarProc)(ZqPort*, int32_t, int32_t, int32_t, int32_t, void*, void*,
-                                      int32_t, int32_t);
 extern ZQ_DATA ZqDrawSBarProc DrawSBar_EX;
-typedef int32_t(ZQ_CALL* ZqTrackSBarEventProc)(ZqPort*, ZqPoint, int32_t, int32_t, int32_t, int32_t,
-                                               void*, void*, int32_t, int32_t);
 extern ZQ_DATA ZqTrackSBarEventProc TrackSBarEvent_EX;
 
 /* Set by the host: paths and calls of instruments. */
@@ -58,7 +62,6 @@ extern ZQ_DATA int32_t(ZQ_CALL* CallInstrumentForPIPost_EX)(void);
 /* Set by the host: menus of plug-in controls. */
 extern ZQ_DATA int32_t(ZQ_CALL* CreatePIMenu_EX)(ZqBaseMenu** menu, const char* name, ZqMenuType,
                                                  int32_t* out);
-typedef int32_t(ZQ_CALL* ZqMenuItemProc)(ZqBaseMenu* menu, int32_t item);
 extern ZQ_DATA ZqMenuItemProc DestroyPIMenu_EX;
 extern ZQ_DATA ZqMenuItemProc EnablePIMenuItem_EX;
 extern ZQ_DATA ZqMenuItemProc DisablePIMenuItem_EX;
@@ -90,7 +93,6 @@ extern ZQ_DATA int32_t(ZQ_CALL* IsPIClusterPartShown_EX)(int32_t, int32_t, int32
 extern ZQ_DATA int32_t(ZQ_CALL* IsPIOwnedBy_EX)(int32_t, int32_t, int32_t* out);
 extern ZQ_DATA int32_t(ZQ_CALL* MoveToPIClusterPart_EX)(int32_t, int32_t, int32_t, int32_t,
                                                         ZqPoint position);
-typedef int32_t(ZQ_CALL* ZqFiveValuesProc)(int32_t, int32_t, int32_t, int32_t, int32_t);
 extern ZQ_DATA ZqFiveValuesProc SetPIClusterPartPopUp_EX;
 extern ZQ_DATA int32_t(ZQ_CALL* SetPIClusterPartSize_EX)(int32_t, int32_t, int32_t, int32_t,
                                                          uint32_t width, uint32_t height);

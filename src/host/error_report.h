@@ -10,27 +10,32 @@
 
 namespace zq::host {
 
-// Error modes: 0 shows each processed result in a message box; 1 and 2 report through the error
-// cluster only.
-inline constexpr std::uint32_t kShowErrors = 0;
-inline constexpr std::uint32_t kDefaultErrorMode = 2;
-
 // Writes status, code and source text into the cluster (null tolerated), remembers the result as
 // the last one, shows it if the mode says so, and returns the code. In an inactive thread: only
 // returns kSystemError. Throws kNotEnoughMemory when the thread's record cannot be made.
 std::int32_t process_result(std::int32_t code, ZqErrorCluster* error, FunctionId function);
 
-// The same under a name that the caller gives.
+// The same under a name that the caller gives. A success is never shown.
 std::int32_t process_result_as(std::int32_t code, ZqErrorCluster* error, std::string_view caller);
 
-// A value above 2 becomes 2.
+// 0 shows each processed result in a message box; 1 and 2 do not. A value above 2 becomes 2.
 void set_error_mode(std::uint32_t mode);
 
-// The last code cut to 16 bits, and the text of the last error if it was reported under a display
-// name.
-std::int16_t last_error(ZqStringHandle* source);
+// The result that was reported last, by any thread.
+struct LastError {
+    std::int32_t code = 0;
+    FunctionId function =
+        FunctionId::kNone;  // of the last failure; none when it was reported under another name
+    std::int32_t message_id = 0;  // string id of the last failure's message
+};
+LastError last_error();
 
-// Makes *text hold the message of one of the library's own codes, terminator included.
+// Makes *source the source text of the last error: empty after a success, and for a failure without
+// function id. Throws kNotEnoughMemory.
+void set_last_source(ZqStringHandle* source);
+
+// Makes *text hold the message of one of the library's own codes, cut to 127 bytes, and a
+// terminating zero that counts. Throws kNullPointer and kNotEnoughMemory.
 void set_error_text(std::int32_t code, ZqStringHandle* text);
 
 }  // namespace zq::host

@@ -1,14 +1,25 @@
-// One-dimensional host arrays of unsigned 32-bit elements.
+// Host arrays: dimension counts of 32 bits, then the elements; made and resized by the host's own
+// service.
 #pragma once
 
 #include <zqvissvc/types.h>
 
+#include <cstddef>
 #include <cstdint>
 #include <span>
 
+#include "host/services.h"
+
 namespace zq::host {
 
-// The elements; empty for a null handle and for a negative count. Valid until the next host call.
+// Gives the array room for the elements behind their counts and returns its block; a null handle is
+// given one. Contents up to the smaller size are kept, the counts are the caller's to store. Throws
+// kNotEnoughMemory; the array then is what it was.
+std::uint8_t* resize_array(ElementType type, std::int32_t dimensions, ZqHandle* array,
+                           std::size_t elements);
+
+// The elements; empty for a null handle and for a count that cannot be. Valid until the next host
+// call.
 std::span<const std::uint32_t> view(ZqArrayU32Handle array);
 
 // Makes *target (a null handle is given a block) hold the elements, which must not lie in host

@@ -14,11 +14,11 @@ void remove_cleanup_procedure(ZqCleanupProc procedure, void* argument);
 void enter_modal_dialog();
 void leave_modal_dialog();
 
-// Brackets a modal dialog for a scope.
+// Brackets a modal dialog for a scope; never fails.
 class ModalDialog {
   public:
-    ModalDialog() { enter_modal_dialog(); }
-    ~ModalDialog() { leave_modal_dialog(); }
+    ModalDialog() noexcept;
+    ~ModalDialog();
     ModalDialog(const ModalDialog&) = delete;
     ModalDialog& operator=(const ModalDialog&) = delete;
 };

@@ -5,7 +5,8 @@
 
 namespace zq::host {
 
-// The calling thread's record, made on first use; lives until the thread ends. Throws kNotEnoughMemory.
+// The calling thread's record, made on first use; lives until the thread ends. Throws
+// kNotEnoughMemory.
 ZqThreadRecordData& thread_record();
 
 // Whether host-facing entry points of the calling thread work at all. Throws kNotEnoughMemory.

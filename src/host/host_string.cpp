@@ -1,0 +1,53 @@
+// Counted strings of the host.
+#include "host/host_string.h"
+
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
+
+#include "base/checked.h"
+#include "host/host_array.h"
+
+namespace zq::host {
+namespace {
+
+bool is_plainly_empty(ZqStringHandle string) {
+    return string == nullptr || (*string != nullptr && (*string)->length == 0);
+}
+
+// Makes room for `length` bytes and stores the length; returns where the bytes go.
+std::uint8_t* resize_string(ZqStringHandle* target, std::size_t length) {
+    const auto count = checked_narrow<std::int32_t>(length);
+    ZqHandle handle = reinterpret_cast<ZqHandle>(*target);
+    std::uint8_t* block = resize_array(ElementType::kU8, 1, &handle, length);
+    *target = reinterpret_cast<ZqStringHandle>(handle);
+    std::memcpy(block, &count, sizeof count);
+    return block + sizeof count;
+}
+
+}  // namespace
+
+std::string_view view(ZqStringHandle string) {
+    if (string == nullptr || *string == nullptr || (*string)->length < 0) return {};
+    return {reinterpret_cast<const char*>((*string)->bytes),
+            static_cast<std::size_t>((*string)->length)};
+}
+
+void set_string(ZqStringHandle* target, std::string_view text) {
+    if (target == nullptr) throw kNullPointer;
+    if (text.empty() && is_plainly_empty(*target)) return;
+    std::uint8_t* bytes = resize_string(target, text.size());
+    if (!text.empty()) std::memcpy(bytes, text.data(), text.size());
+}
+
+void copy_string(ZqStringHandle* target, ZqStringHandle source) {
+    if (target == nullptr) throw kNullPointer;
+    if (*target == source) return;
+    const std::size_t length = view(source).size();
+    if (length == 0) return set_string(target, {});
+    std::uint8_t* bytes = resize_string(target, length);
+    // The call may have moved the source's block too.
+    std::memcpy(bytes, view(source).data(), length);
+}
+
+}  // namespace zq::host
