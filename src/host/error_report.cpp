@@ -176,6 +176,10 @@ void set_last_source(ZqStringHandle* source) {
     set_string(source, source_text(last.code, last.function).view());
 }
 
+std::string message_text(std::int32_t code) {
+    return std::string(look_up(code, FunctionId::kNone).message.view());
+}
+
 void set_error_text(std::int32_t code, ZqStringHandle* text) {
     const std::int64_t id = code == 0 ? kSuccessMessageId : own_message_id(code);
     Text<kErrorTextBytes> message;

@@ -4,6 +4,7 @@
 #include <zqvissvc/types.h>
 
 #include <cstdint>
+#include <string>
 #include <string_view>
 
 #include "host/function_ids.h"
@@ -33,6 +34,9 @@ LastError last_error();
 // Makes *source the source text of the last error: empty after a success, and for a failure without
 // function id. Throws kNotEnoughMemory.
 void set_last_source(ZqStringHandle* source);
+
+// Message of a code from whichever registered table holds it, without a name.
+std::string message_text(std::int32_t code);
 
 // Makes *text hold the message of one of the library's own codes, cut to 127 bytes, and a
 // terminating zero that counts. Throws kNullPointer and kNotEnoughMemory.

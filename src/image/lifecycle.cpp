@@ -45,10 +45,10 @@ ImageHandle reshape_existing(std::string_view name, const Shaper& shape) {
     return image->handle();
 }
 
-ImageHandle find_or_create(std::string_view name, Variant variant, const Shaper& shape) {
+Created find_or_create(std::string_view name, Variant variant, const Shaper& shape) {
     for (;;) {
         if (const ImageHandle found = reshape_existing(name, shape)) {
-            return found;
+            return {found, false};
         }
         auto image = std::make_unique<Image>(variant, name);
         shape(*image);
@@ -56,7 +56,7 @@ ImageHandle find_or_create(std::string_view name, Variant variant, const Shaper&
         std::unique_ptr<Object> object = std::move(image);
         // Another thread may have registered the name since; then its image is the one to take.
         if (Registry::instance().add(object, image_handler, kImageTag, name, !name.empty())) {
-            return handle;
+            return {handle, true};
         }
     }
 }
@@ -64,15 +64,15 @@ ImageHandle find_or_create(std::string_view name, Variant variant, const Shaper&
 }  // namespace
 
 ImageHandle new_image(const ImageShape& shape) {
-    return new_named_image(shape, {}, Variant::kRegistered);
+    return new_named_image(shape, {}, Variant::kRegistered).image;
 }
 
-ImageHandle new_named_image(const ImageShape& shape, std::string_view name, Variant variant) {
+Created new_named_image(const ImageShape& shape, std::string_view name, Variant variant) {
     return find_or_create(name, variant, [&shape](Image& image) { image.reinitialise(shape); });
 }
 
-ImageHandle new_external_image(const ImageShape& shape, std::uint8_t* buffer,
-                               std::int32_t row_pixels, std::string_view name) {
+Created new_external_image(const ImageShape& shape, std::uint8_t* buffer, std::int32_t row_pixels,
+                           std::string_view name) {
     return find_or_create(name, Variant::kRegistered,
                           [&](Image& image) { image.wrap_external(shape, buffer, row_pixels); });
 }

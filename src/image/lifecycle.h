@@ -12,17 +12,22 @@ namespace zq {
 // std::bad_alloc and leave no image behind; the registry owns the image, the caller gets its
 // handle.
 
+struct Created {
+    ImageHandle image;
+    bool is_new;  // false: an image of that name was there and has been re-initialised
+};
+
 ImageHandle new_image(const ImageShape& shape);
 
 // Finds or creates: an image of that name is locked and re-initialised (its contents, calibration
 // and extra information are lost; it keeps its variant), otherwise one of the given variant is
 // made. An empty name makes an unnamed image.
-ImageHandle new_named_image(const ImageShape& shape, std::string_view name, Variant variant);
+Created new_named_image(const ImageShape& shape, std::string_view name, Variant variant);
 
 // As new_named_image, but the pixels are the caller's buffer, which must outlive its use by the
 // image and is never freed here. A later change of size gives the image a buffer of its own and
 // leaves the caller's alone. Also throws kExternalBufferAlignment and kNullPointer.
-ImageHandle new_external_image(const ImageShape& shape, std::uint8_t* buffer,
+Created new_external_image(const ImageShape& shape, std::uint8_t* buffer,
                                std::int32_t row_pixels, std::string_view name);
 
 // Waits for operations under way on the image. A null handle or one that is not (any more)

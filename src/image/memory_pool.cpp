@@ -55,6 +55,19 @@ void MemoryPool::destroy() {
     if (enabled_) {
         throw kPoolEnabled;
     }
+    retire_pool();
+}
+
+void MemoryPool::abandon() noexcept {
+    const std::lock_guard lock(mutex_);
+    enabled_ = false;
+    if (pool_ != nullptr) {
+        retire_pool();
+    }
+}
+
+// Memory that still holds blocks stays until the last of them is given back.
+void MemoryPool::retire_pool() noexcept {
     if (pool_->live_blocks == 0) {
         storages_.pop_back();
         any_storage_ = !storages_.empty();

@@ -24,6 +24,8 @@ class MemoryPool {
     // Does nothing without a pool; throws kPoolInUse with live reservations, kPoolEnabled while
     // enabled.
     void destroy();
+    // Releases the pool whatever its state, at the end of the host's run.
+    void abandon() noexcept;
     // Throws kPoolMissing.
     void enable(bool enabled);
     // Throws kPoolEnabled while enabled; does nothing without a pool.
@@ -49,6 +51,7 @@ class MemoryPool {
         std::size_t size = 0;
         std::size_t live_blocks = 0;  // not lowered by a reset
     };
+    void retire_pool() noexcept;
     Storage* storage_of(const void* block) const;
 
     platform::Mutex mutex_;

@@ -1,0 +1,37 @@
+// Host image values: from a value to its image, and from a new image to a value that the host
+// knows.
+#pragma once
+
+#include <zqvissvc/types.h>
+
+#include "base/error_codes.h"
+#include "image/image.h"
+
+namespace zq::host {
+
+// The type under which images are sessions of the host.
+inline constexpr char kSessionType[] = "KEMOImage";
+
+struct LookUp {
+    ImageHandle image;
+    GRLIBError_enum code;
+};
+
+// The value's image word decides; the host's session only tells whether a null value means
+// anything.
+LookUp look_up(const ZqImageValue* value);
+
+// As look_up; throws its code, and kNotAnImage when the value means no image.
+ImageHandle require_image(const ZqImageValue* value);
+
+// Registers an image with the host under a name and remembers the cookie in the image; a session
+// that the image had is removed. Throws kNotInitialized when the host lacks the service,
+// kSystemError when it refuses.
+void register_session(ImageHandle image, ZqStringHandle name);
+
+// Makes the host dispose the image when it tears the caller down.
+void dispose_at_teardown(ImageHandle image);
+
+void set_cookie(ImageHandle image, std::uint32_t cookie);
+
+}  // namespace zq::host
