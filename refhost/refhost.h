@@ -32,6 +32,10 @@ size_t live_blocks();
 // Size in bytes; empty for anything but a live handle.
 std::optional<size_t> handle_size(const void* handle);
 
+// Paths that the path services made.
+std::optional<std::string> path_text(ZqPath path);
+bool dispose_path(ZqPath path);  // false for what is no path
+
 // ---- Refusals and counters. `service` is the exported name, "DSNewHandle" for instance; a name
 // that is no service throws std::invalid_argument.
 
