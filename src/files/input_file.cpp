@@ -1,0 +1,61 @@
+// Checked reading.
+#include "files/input_file.h"
+
+#include <cerrno>
+#include <utility>
+
+#include "base/checked.h"
+#include "files/stdio_errors.h"
+#include "platform/file.h"
+
+namespace zq {
+
+namespace {
+
+Stream open_for_reading(const char* path) {
+    Stream stream(platform::open_file(path, "rb"));
+    if (!stream) throw code_of_errno(errno);
+    return stream;
+}
+
+}  // namespace
+
+InputFile::InputFile(const char* path) : InputFile(open_for_reading(path), kUnknownSize) {
+    size_ = platform::regular_size(stream_.get());
+}
+
+InputFile::InputFile(Stream stream, std::int64_t size)
+    : buffer_(std::make_unique<char[]>(kStreamBuffer)), stream_(std::move(stream)), size_(size) {
+    // Refused only for lack of memory of the C library's own; reading then goes on with its
+    // default.
+    std::setvbuf(stream_.get(), buffer_.get(), _IOFBF, kStreamBuffer);
+}
+
+void InputFile::rewind() {
+    std::clearerr(stream_.get());
+    if (std::fseek(stream_.get(), 0, SEEK_SET) != 0) throw code_of_errno(errno);
+}
+
+void InputFile::seek(long offset) {
+    if (std::fseek(stream_.get(), offset, SEEK_SET) != 0) throw kUnableToReadData;
+}
+
+std::size_t InputFile::read_some(void* bytes, std::size_t count) noexcept {
+    return std::fread(bytes, 1, count, stream_.get());
+}
+
+void InputFile::read(void* bytes, std::size_t count, GRLIBError_enum short_read) {
+    if (read_some(bytes, count) != count) throw short_read;
+}
+
+void InputFile::read_header_bytes(void* bytes, std::size_t count) {
+    if (read_some(bytes, count) == count) return;
+    throw code_of_errno(std::ferror(stream_.get()) != 0 ? errno : 0);
+}
+
+void InputFile::require(std::uint64_t offset, std::uint64_t count) const {
+    if (size_ == kUnknownSize) return;
+    if (checked_add(offset, count) > static_cast<std::uint64_t>(size_)) throw kUnableToReadData;
+}
+
+}  // namespace zq

@@ -1,0 +1,47 @@
+// A file being read: the stream, its size where that can be known, and reads whose every shortfall
+// becomes an error code.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+
+#include "base/error_codes.h"
+#include "files/stream.h"
+
+namespace zq {
+
+class InputFile {
+  public:
+    // Throws the mapped error number when the path cannot be opened.
+    explicit InputFile(const char* path);
+    // Takes an open stream of `size` bytes; kUnknownSize when that cannot be told.
+    InputFile(Stream stream, std::int64_t size);
+
+    static constexpr std::int64_t kUnknownSize = -1;
+    std::int64_t size() const { return size_; }
+
+    // Throws the mapped error number; a stream without positions (a pipe) cannot be probed.
+    void rewind();
+    // Offset from the start. Throws kUnableToReadData.
+    void seek(long offset);
+
+    // Bytes that came: fewer than asked for only at the end of the file or on a failure.
+    std::size_t read_some(void* bytes, std::size_t count) noexcept;
+    // All of them, or `short_read` is thrown.
+    void read(void* bytes, std::size_t count, GRLIBError_enum short_read);
+    // All of them, or the mapped error number is thrown (end of file: kFileIo).
+    void read_header_bytes(void* bytes, std::size_t count);
+
+    // Throws kUnableToReadData when the file is known to end before `offset` + `count`. What a
+    // header announces goes through here before memory is taken for it.
+    void require(std::uint64_t offset, std::uint64_t count) const;
+
+  private:
+    // Declared before the stream, which uses it until it is closed.
+    std::unique_ptr<char[]> buffer_;
+    Stream stream_;
+    std::int64_t size_;
+};
+
+}  // namespace zq

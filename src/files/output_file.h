@@ -1,0 +1,51 @@
+// A file being written. An existing regular file, or an absent one, is written beside its place and
+// put there at the end, so that a failed write never damages what was there; anything else (a
+// device, a pipe) is written directly.
+#pragma once
+
+#include <cstddef>
+#include <memory>
+#include <string>
+
+#include "base/error_codes.h"
+#include "files/stream.h"
+
+namespace zq {
+
+class OutputFile {
+  public:
+    // Throws the mapped error number when the file cannot be made.
+    explicit OutputFile(const char* path);
+    // Without commit: closes, and removes what was begun.
+    ~OutputFile();
+    OutputFile(const OutputFile&) = delete;
+    OutputFile& operator=(const OutputFile&) = delete;
+
+    // False on a failure; last_error() then says why.
+    bool try_write(const void* bytes, std::size_t count) noexcept;
+    bool try_flush() noexcept;
+    GRLIBError_enum last_error() const { return last_error_; }
+
+    // Throws the mapped error number.
+    void write(const void* bytes, std::size_t count);
+
+    // Closes the file and puts it in its place. Throws the mapped error number; the place then
+    // holds what it held before.
+    void commit();
+
+    // Closes the file, ignoring failures, and keeps what was written: under the target's name when
+    // nothing stood there, else it is removed like any failed write.
+    void abandon_in_place() noexcept;
+
+  private:
+    bool close() noexcept;
+
+    std::string target_;
+    std::string written_;  // name of the file beside the target; empty: written directly
+    bool target_existed_ = false;
+    GRLIBError_enum last_error_ = kSuccess;
+    std::unique_ptr<char[]> buffer_;
+    Stream stream_;
+};
+
+}  // namespace zq

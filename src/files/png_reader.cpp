@@ -1,0 +1,199 @@
+// Reading PNG. libpng delivers rows in the layout of the image's type, straight into the image.
+#include "files/png_reader.h"
+
+#include <algorithm>
+#include <cstring>
+
+#include "base/checked.h"
+#include "files/png_chunks.h"
+#include "files/write_job.h"
+
+namespace zq {
+
+namespace {
+
+// Deflate cannot grow data by more than this factor.
+constexpr std::uint64_t kMostInflation = 1032;
+constexpr std::int32_t kSignedMinimum = -32768;
+constexpr std::int32_t kSignedMaximum = 32767;
+
+void read_bytes(png_structp png, png_bytep bytes, std::size_t count) {
+    auto* file = static_cast<InputFile*>(png_get_io_ptr(png));
+    if (file->read_some(bytes, count) != count) PngSession::fail(png, kUnableToReadData);
+}
+
+// Everything but what a read uses is passed over unread: nothing that a file carries beside its
+// pixels costs memory or can be wrong.
+void choose_chunks(png_structp png) {
+    png_set_keep_unknown_chunks(png, PNG_HANDLE_CHUNK_NEVER, nullptr, -1);
+    png_set_keep_unknown_chunks(png, PNG_HANDLE_CHUNK_ALWAYS, kSampleOffsetChunk.data(), 1);
+}
+
+// The first that stands before the pixels counts.
+std::optional<std::int16_t> find_sample_offset(png_structp png, png_infop info) {
+    png_unknown_chunkp chunks = nullptr;
+    const int count = png_get_unknown_chunks(png, info, &chunks);
+    for (int i = 0; i < count; ++i) {
+        const png_unknown_chunk& chunk = chunks[i];
+        const bool wanted = std::memcmp(chunk.name, kSampleOffsetChunk.data(), 4) == 0;
+        if (!wanted || (chunk.location & PNG_AFTER_IDAT) != 0) continue;
+        if (const auto offset = parse_sample_offset({chunk.data, chunk.size})) return offset;
+    }
+    return std::nullopt;
+}
+
+// Whether any of the unsigned samples is above 32767. Four at a time.
+bool any_above_signed(const std::uint8_t* row, std::size_t bytes) {
+    std::uint64_t all = 0;
+    std::size_t i = 0;
+    for (; i + sizeof(all) <= bytes; i += sizeof(all)) {
+        std::uint64_t four;
+        std::memcpy(&four, row + i, sizeof(four));
+        all |= four;
+    }
+    for (; i < bytes; i += 2) all |= std::uint64_t{row[i + 1]} << 8;
+    return (all & 0x8000800080008000U) != 0;
+}
+
+}  // namespace
+
+PngReader::PngReader(InputFile& file) : file_(file), session_(PngSession::Use::kRead) {}
+
+void PngReader::read_info() {
+    const png_structp png = session_.png();
+    const png_infop info = session_.info();
+    session_.run(kInvalidFileHeader, [this, png, info] {
+        png_set_read_fn(png, &file_, read_bytes);
+        png_set_sig_bytes(png, kPngSignatureBytes);
+        choose_chunks(png);
+        png_read_info(png, info);
+    });
+    width_ = png_get_image_width(png, info);
+    height_ = png_get_image_height(png, info);
+    depth_ = png_get_bit_depth(png, info);
+    colour_type_ = png_get_color_type(png, info);
+    channels_ = png_get_channels(png, info);
+    sample_offset_ = find_sample_offset(png, info);
+    check_plausible();
+}
+
+void PngReader::check_plausible() const {
+    if (file_.size() == InputFile::kUnknownSize) return;
+    const std::uint64_t row_bits =
+        std::uint64_t{width_} * static_cast<std::uint64_t>(bits_per_pixel());
+    const std::uint64_t bytes = checked_mul<std::uint64_t>(row_bits, height_) / 8;
+    if (bytes / kMostInflation > static_cast<std::uint64_t>(file_.size())) throw kUnableToReadData;
+}
+
+PixelType PngReader::pixel_type() const {
+    if (colour_type_ == PNG_COLOR_TYPE_PALETTE) return PixelType::kU8;
+    if (colour_type_ == PNG_COLOR_TYPE_GRAY) return depth_ == 16 ? PixelType::kI16 : PixelType::kU8;
+    return depth_ == 16 ? PixelType::kRgbU64 : PixelType::kRgb;
+}
+
+PixelFormat PngReader::pixel_format() const {
+    const bool wide = depth_ == 16;
+    if (colour_type_ == PNG_COLOR_TYPE_RGB) return wide ? PixelFormat::kRgb48 : PixelFormat::kRgb24;
+    if ((colour_type_ & PNG_COLOR_MASK_ALPHA) != 0) {
+        return wide ? PixelFormat::kRgb64 : PixelFormat::kRgb32;
+    }
+    switch (depth_) {
+        case 1:
+            return PixelFormat::kGrey1;
+        case 2:
+            return PixelFormat::kGrey2;
+        case 4:
+            return PixelFormat::kGrey4;
+        case 8:
+            return PixelFormat::kGrey8;
+        default:
+            return PixelFormat::kGrey16;
+    }
+}
+
+std::vector<std::uint32_t> PngReader::colour_table() const {
+    if (colour_type_ != PNG_COLOR_TYPE_PALETTE) return {};
+    png_colorp palette = nullptr;
+    int count = 0;
+    png_get_PLTE(session_.png(), session_.info(), &palette, &count);
+    png_bytep alpha = nullptr;
+    int alpha_count = 0;
+    const bool has_alpha =
+        png_get_tRNS(session_.png(), session_.info(), &alpha, &alpha_count, nullptr) != 0;
+    std::vector<std::uint32_t> table(kColourTableSize, 0);
+    for (int i = 0; i < count; ++i) {
+        // With some alpha in the file, entries without one are opaque; without any, alpha is 0.
+        const std::uint32_t a = !has_alpha ? 0 : i < alpha_count ? alpha[i] : 255;
+        const png_color& c = palette[i];
+        table[static_cast<std::size_t>(i)] =
+            a << 24 | std::uint32_t{c.red} << 16 | std::uint32_t{c.green} << 8 | c.blue;
+    }
+    return table;
+}
+
+// Called inside a step.
+void PngReader::set_transformations() {
+    const png_structp png = session_.png();
+    if (depth_ == 16) png_set_swap(png);
+    switch (pixel_type()) {
+        case PixelType::kU8:
+            png_set_packing(png);
+            if (colour_type_ == PNG_COLOR_TYPE_GRAY) png_set_expand_gray_1_2_4_to_8(png);
+            break;
+        case PixelType::kI16:
+            break;
+        default:
+            if ((colour_type_ & PNG_COLOR_MASK_COLOR) == 0) png_set_gray_to_rgb(png);
+            if (png_get_valid(png, session_.info(), PNG_INFO_tRNS) != 0) png_set_tRNS_to_alpha(png);
+            png_set_filler(png, 0, PNG_FILLER_AFTER);
+            png_set_bgr(png);
+            break;
+    }
+}
+
+void PngReader::read_pixels(Image& image) {
+    const png_structp png = session_.png();
+    const bool is_16_bit_grey = pixel_type() == PixelType::kI16;
+    int passes = 0;
+    session_.run(kUnableToReadData, [this, png, &passes] {
+        set_transformations();
+        passes = png_set_interlace_handling(png);
+        png_read_update_info(png, session_.info());
+    });
+    const auto row_bytes =
+        static_cast<std::size_t>(width()) * static_cast<std::size_t>(bytes_per_pixel(image.type()));
+    if (png_get_rowbytes(png, session_.info()) != row_bytes) throw kUnableToReadData;
+    bool above_signed = false;
+    session_.run(kUnableToReadData, [&] {
+        for (int pass = 0; pass < passes; ++pass) {
+            for (std::int32_t y = 0; y < height(); ++y) {
+                png_read_row(png, image.row(y), nullptr);
+                if (is_16_bit_grey && pass + 1 == passes && !above_signed) {
+                    above_signed = any_above_signed(image.row(y), row_bytes);
+                }
+            }
+        }
+        // A file that lacks its end is a file cut short.
+        png_read_end(png, nullptr);
+    });
+    if (is_16_bit_grey) apply_sample_offset(image, above_signed);
+}
+
+// Samples are unsigned, pixels signed. A file that does not say what was subtracted from its
+// samples, and has some that are too large, comes through with all of them moved down.
+void PngReader::apply_sample_offset(Image& image, bool samples_above_signed) const {
+    const std::int32_t offset = sample_offset_.value_or(
+        static_cast<std::int16_t>(samples_above_signed ? kSignedMinimum : 0));
+    image.set_sample_offset(offset);
+    if (offset == 0 && !samples_above_signed) return;
+    for (std::int32_t y = 0; y < height(); ++y) {
+        auto* samples = reinterpret_cast<std::uint16_t*>(image.row(y));
+        for (std::int32_t x = 0; x < width(); ++x) {
+            const std::int32_t value = samples[x] + offset;
+            samples[x] =
+                static_cast<std::uint16_t>(std::clamp(value, kSignedMinimum, kSignedMaximum));
+        }
+    }
+}
+
+}  // namespace zq

@@ -1,0 +1,227 @@
+// Writing PNG. libpng turns rows from the layout of the image's type into the file's.
+#include "files/png_writer.h"
+
+#include <algorithm>
+#include <array>
+#include <cstring>
+
+#include "files/png_chunks.h"
+
+namespace zq {
+
+namespace {
+
+constexpr std::int32_t kLargestSetting = 100;
+constexpr std::int32_t kLargestSample = 65535;
+
+void write_bytes(png_structp png, png_bytep bytes, std::size_t count) {
+    auto* file = static_cast<OutputFile*>(png_get_io_ptr(png));
+    if (!file->try_write(bytes, count)) PngSession::fail(png, file->last_error());
+}
+
+// The stream is flushed at the end, where a failure is seen.
+void flush_nothing(png_structp) {}
+
+template <class Channel>
+bool row_has_alpha(const std::uint8_t* row, std::int32_t width) {
+    Channel all = 0;
+    for (std::int32_t x = 0; x < width; ++x) {
+        Channel alpha;
+        std::memcpy(&alpha,
+                    row + (std::size_t{4} * static_cast<std::size_t>(x) + 3) * sizeof(Channel),
+                    sizeof(alpha));
+        all = static_cast<Channel>(all | alpha);
+    }
+    return all != 0;
+}
+
+bool has_alpha(const PixelView& pixels) {
+    if (pixels.packing != Packing::kNative) return false;
+    const auto row_test = pixels.type == PixelType::kRgbU64 ? row_has_alpha<std::uint16_t>
+                                                            : row_has_alpha<std::uint8_t>;
+    for (std::int32_t y = 0; y < pixels.height; ++y) {
+        if (row_test(pixels.row(y), pixels.width)) return true;
+    }
+    return false;
+}
+
+struct Range {
+    std::int32_t lowest;
+    std::int32_t highest;
+};
+
+Range range_of(const PixelView& pixels) {
+    std::int16_t lowest = INT16_MAX;
+    std::int16_t highest = INT16_MIN;
+    for (std::int32_t y = 0; y < pixels.height; ++y) {
+        const auto* row = reinterpret_cast<const std::int16_t*>(pixels.row(y));
+        for (std::int32_t x = 0; x < pixels.width; ++x) {
+            lowest = std::min(lowest, row[x]);
+            highest = std::max(highest, row[x]);
+        }
+    }
+    return {lowest, highest};
+}
+
+// The offset with which the image was read, so that its samples become what they were; or the one
+// that its negative values need.
+std::int32_t choose_sample_offset(const PixelView& pixels) {
+    if (pixels.packing == Packing::kUnsigned16) return 0;
+    const Range range = range_of(pixels);
+    const std::int32_t remembered = pixels.sample_offset;
+    if (range.lowest >= remembered && range.highest - remembered <= kLargestSample)
+        return remembered;
+    return std::min(range.lowest, 0);
+}
+
+}  // namespace
+
+PngCompression png_compression(std::int32_t setting, int colour_type, bool has_transparency) {
+    constexpr std::array<int, 5> kSingle = {PNG_FILTER_NONE, PNG_FILTER_SUB, PNG_FILTER_UP,
+                                            PNG_FILTER_AVG, PNG_FILTER_PAETH};
+    const std::int32_t strength = kLargestSetting - setting;
+    const auto digit = static_cast<std::size_t>(strength % 10);
+    PngCompression result{.level = std::min(strength / 10, 9)};
+    if (digit < kSingle.size()) {
+        result.filters = kSingle[digit];
+    } else if (digit == kSingle.size()) {
+        const bool photographic = (colour_type & PNG_COLOR_MASK_COLOR) != 0 &&
+                                  (colour_type & PNG_COLOR_MASK_PALETTE) == 0;
+        const bool grey_with_alpha = colour_type == PNG_COLOR_TYPE_GRAY_ALPHA;
+        const bool all = (photographic || grey_with_alpha) && !has_transparency && strength >= 50;
+        result.filters = all ? PNG_ALL_FILTERS : PNG_FILTER_NONE;
+    }
+    return result;
+}
+
+void PngWriter::check(const WriteJob& job) {
+    const PixelView& pixels = job.pixels;
+    const std::int32_t setting = job.options.words[0];
+    if (job.options.present && (setting < 0 || setting > kLargestSetting)) throw kInvalidParameter;
+    switch (pixels.type) {
+        case PixelType::kU8:
+        case PixelType::kI16:
+        case PixelType::kRgb:
+        case PixelType::kRgbU64:
+            break;
+        default:
+            throw kIncompatibleImageType;
+    }
+    if (pixels.width == 0 || pixels.height == 0) throw kImageTooSmall;
+}
+
+PngWriter::PngWriter(OutputFile& file, const WriteJob& job)
+    : file_(file), job_(job), session_(PngSession::Use::kWrite) {
+    choose_layout();
+}
+
+void PngWriter::choose_layout() {
+    const PixelView& pixels = job_.pixels;
+    depth_ = pixels.type == PixelType::kI16 || pixels.type == PixelType::kRgbU64 ? 16 : 8;
+    switch (pixels.type) {
+        case PixelType::kU8:
+            colour_type_ = job_.colour_table.empty() ? PNG_COLOR_TYPE_GRAY : PNG_COLOR_TYPE_PALETTE;
+            table_has_alpha_ = std::any_of(job_.colour_table.begin(), job_.colour_table.end(),
+                                           [](std::uint32_t entry) { return entry >> 24 != 0; });
+            break;
+        case PixelType::kI16:
+            colour_type_ = PNG_COLOR_TYPE_GRAY;
+            sample_offset_ = choose_sample_offset(pixels);
+            if (sample_offset_ != 0) shifted_.resize(static_cast<std::size_t>(pixels.width));
+            break;
+        default:
+            colour_type_ = has_alpha(pixels) ? PNG_COLOR_TYPE_RGB_ALPHA : PNG_COLOR_TYPE_RGB;
+            break;
+    }
+}
+
+// The functions up to set_transformations are called inside a step.
+
+void PngWriter::set_header() {
+    png_set_IHDR(session_.png(), session_.info(), static_cast<png_uint_32>(job_.pixels.width),
+                 static_cast<png_uint_32>(job_.pixels.height), depth_, colour_type_,
+                 PNG_INTERLACE_NONE, PNG_COMPRESSION_TYPE_DEFAULT, PNG_FILTER_TYPE_DEFAULT);
+}
+
+void PngWriter::set_palette() {
+    if (colour_type_ != PNG_COLOR_TYPE_PALETTE) return;
+    std::array<png_color, kColourTableSize> palette;
+    std::array<png_byte, kColourTableSize> alpha;
+    for (std::size_t i = 0; i < kColourTableSize; ++i) {
+        const std::uint32_t entry = job_.colour_table[i];
+        palette[i] = {static_cast<png_byte>(entry >> 16), static_cast<png_byte>(entry >> 8),
+                      static_cast<png_byte>(entry)};
+        alpha[i] = static_cast<png_byte>(entry >> 24);
+    }
+    png_set_PLTE(session_.png(), session_.info(), palette.data(), kColourTableSize);
+    if (table_has_alpha_) {
+        png_set_tRNS(session_.png(), session_.info(), alpha.data(), kColourTableSize, nullptr);
+    }
+}
+
+void PngWriter::set_sample_offset() {
+    if (sample_offset_ == 0) return;
+    SampleOffsetBytes bytes = make_sample_offset(static_cast<std::int16_t>(sample_offset_));
+    png_unknown_chunk chunk{};
+    std::memcpy(chunk.name, kSampleOffsetChunk.data(), kSampleOffsetChunk.size());
+    chunk.data = bytes.data();
+    chunk.size = bytes.size();
+    chunk.location = PNG_HAVE_PLTE;  // behind the palette's place and before the pixels
+    png_set_unknown_chunks(session_.png(), session_.info(), &chunk, 1);
+}
+
+void PngWriter::set_compression() {
+    PngCompression compression;
+    if (job_.options.present) {
+        compression = png_compression(job_.options.words[0], colour_type_, table_has_alpha_);
+    }
+    png_set_compression_level(session_.png(), compression.level);
+    png_set_filter(session_.png(), PNG_FILTER_TYPE_BASE, compression.filters);
+}
+
+void PngWriter::set_transformations() {
+    const png_structp png = session_.png();
+    if (depth_ == 16) png_set_swap(png);
+    if ((colour_type_ & PNG_COLOR_MASK_COLOR) == 0 || colour_type_ == PNG_COLOR_TYPE_PALETTE)
+        return;
+    png_set_bgr(png);
+    if (colour_type_ == PNG_COLOR_TYPE_RGB && job_.pixels.packing != Packing::kPacked24) {
+        png_set_filler(png, 0, PNG_FILLER_AFTER);
+    }
+}
+
+void PngWriter::write_info() {
+    session_.run(kUnableToWriteData, [this] {
+        png_set_write_fn(session_.png(), &file_, write_bytes, flush_nothing);
+        set_header();
+        set_palette();
+        set_sample_offset();
+        set_compression();
+        png_write_info(session_.png(), session_.info());
+        set_transformations();
+    });
+}
+
+const std::uint8_t* PngWriter::samples_of_row(std::int32_t y) {
+    const std::uint8_t* row = job_.pixels.row(y);
+    if (shifted_.empty()) return row;
+    const auto* values = reinterpret_cast<const std::int16_t*>(row);
+    for (std::size_t x = 0; x < shifted_.size(); ++x) {
+        shifted_[x] = static_cast<std::uint16_t>(values[x] - sample_offset_);
+    }
+    return reinterpret_cast<const std::uint8_t*>(shifted_.data());
+}
+
+void PngWriter::write_rows() {
+    session_.run(kUnableToWriteData, [this] {
+        for (std::int32_t y = 0; y < job_.pixels.height; ++y) {
+            png_write_row(session_.png(), samples_of_row(y));
+        }
+    });
+}
+
+void PngWriter::write_end() {
+    session_.run(kUnableToWriteData, [this] { png_write_end(session_.png(), session_.info()); });
+}
+
+}  // namespace zq

@@ -1,0 +1,54 @@
+// Writes pixels as a PNG stream through libpng.
+#pragma once
+
+#include <cstdint>
+#include <vector>
+
+#include "files/output_file.h"
+#include "files/png_session.h"
+#include "files/write_job.h"
+
+namespace zq {
+
+// How hard a write tries.
+struct PngCompression {
+    int level = 6;  // of zlib
+    int filters = PNG_ALL_FILTERS;
+};
+
+// `setting` is 0 (smallest file) to 100 (no compression).
+PngCompression png_compression(std::int32_t setting, int colour_type, bool has_transparency);
+
+class PngWriter {
+  public:
+    // Both must outlive the writer.
+    PngWriter(OutputFile& file, const WriteJob& job);
+
+    // Throw the mapped error number.
+    void write_info();
+    void write_rows();
+    void write_end();
+
+    // Throws kInvalidParameter, kIncompatibleImageType or kImageTooSmall for what no PNG can hold.
+    static void check(const WriteJob& job);
+
+  private:
+    void choose_layout();
+    void set_header();
+    void set_palette();
+    void set_sample_offset();
+    void set_compression();
+    void set_transformations();
+    const std::uint8_t* samples_of_row(std::int32_t y);
+
+    OutputFile& file_;
+    const WriteJob& job_;
+    PngSession session_;
+    int colour_type_ = 0;
+    int depth_ = 8;
+    bool table_has_alpha_ = false;
+    std::int32_t sample_offset_ = 0;      // subtracted from signed 16-bit values
+    std::vector<std::uint16_t> shifted_;  // one row less the sample offset; empty when that is 0
+};
+
+}  // namespace zq
