@@ -1,0 +1,131 @@
+/* Image files: writing, reading, and plain pixel buffers to and from files.
+ *
+ * Types by code and name: 1 "AIPD" (the native format: every pixel type, lossless), 4 "PNG" (U8
+ * with or without colour table, I16, RGB, RGB (U64)). Names are compared without regard to letter
+ * case; leading white space is skipped, blanks behind the name and characters after the eighth do
+ * not count.
+ *
+ * Paths are zero-terminated, in the encoding of the C run-time. Writing never leaves a half-written
+ * file over a good one: the new file is made beside the old one and takes its place when it is
+ * complete. Devices and pipes are written directly. Reading never changes the image unless the
+ * whole file proved good.
+ *
+ * Codes of reading and writing: -1074395995 file not found, -1074395992 access denied, -1074395994
+ * too many files open, -1074395983 disk full, -1074395993 any other failure of the system (a file
+ * too short to be probed, too), -1074395991 no such type, or a file of a type that nobody
+ * recognises, -1074396000 bad file header, -1074395989 file cut short or damaged, -1074395988
+ * header not written, -1074396159 no memory, or a picture of more than 2147483647 bytes.
+ *
+ * Threads: any; an image is locked for the whole call. */
+#ifndef ZQVISSVC_FILES_H
+#define ZQVISSVC_FILES_H
+
+#include "types.h"
+
+ZQ_BEGIN_C
+
+/* Options of a write; a null pointer, or `present` 0, means the defaults.
+ * words[0]  PNG: compression setting, 0 (smallest file, slow) to 100 (not compressed), else
+ *           -1074395997. Strength s = 100 - setting: zlib level s / 10, at most 9; the last digit
+ *           of s picks the row filter: 0 none, 1 sub, 2 up, 3 average, 4 Paeth, 5 all for strong
+ *           compression of colour and else none, 6 to 9 all. The default is level 6 with all.
+ *           JPEG: quality, 0 to 1000.
+ * words[1], words[2]  other formats' parameters; 0. */
+typedef struct ZqWriteOptions {
+    int32_t present;
+    int32_t words[3];
+} ZqWriteOptions;
+
+/* How to read a file without a header, as seven words. */
+typedef struct ZqRawParameters {
+    int32_t present; /* not 0: the file is read by these parameters and not probed */
+    int32_t format;
+    int32_t dataOffset; /* bytes from the start of the file */
+    int32_t layoutMode;
+    int32_t layout[2]; /* used in layout mode 2 only */
+    int32_t byteOrder; /* 0 little-endian, 1 big-endian */
+} ZqRawParameters;
+
+/* Writes an image under a type name.
+ * image        borrowed.
+ * path         borrowed; empty or null: -1074395997.
+ * fileType     borrowed; a name from above.
+ * colourTable  borrowed; null, or an array of 0 or 256 entries 0xAARRGGBB (else -1074395976), 256
+ *              for U8 images only (else -1074396082). PNG keeps it; AIPD has no place for it.
+ * options      borrowed; may be null.
+ * -1074396077 when the type cannot hold the image's pixel type, -1074396154 for a PNG without
+ * pixels. After a failure the path holds what it held before; only a new AIPD file whose header
+ * could not be written (-1074395988) stays as far as it went. */
+ZQ_API ZqError ZQ_CALL DF_WriteFile2(const ZqImageValue* image, const char* path,
+                                     const char* fileType, ZqArrayU32Handle* colourTable,
+                                     const ZqWriteOptions* options, ZqErrorCluster* error);
+
+/* Writes a plain pixel buffer; the extension of the path (bmp, tif, tiff, png, jpg, jpeg, in any
+ * letter case) names the type.
+ * buffer        borrowed; height rows, top row first, without padding between them.
+ * bitsPerPixel, bufferKind  what a pixel is:
+ *     kind 0: 32 bits; kind 4: 24 bits, or 32 for any other number; kind 13: 24 bits;
+ *     kind 17: 8 grey; 9 to 16 unsigned grey in 16 bits; 24, else 17 to 32: 32 bits; above 32,
+ *     and 1 to 7: 64 bits (16 a channel). 24 bits are blue, green, red; 32 and 64 have alpha
+ *     behind them.
+ * Returns 0, 0xBFF60005 null path, 0xBFF60006 null buffer, 0xBFF60046 another kind or number of
+ * bits, 0xBFF60047 no or another extension, 0xBFF60003 no memory, 0xBFF60050 any other failure (a
+ * width or height below 1, too). */
+ZQ_API ZqError ZQ_CALL Gen_SaveBuffer(const char* path, const void* buffer, int32_t bitsPerPixel,
+                                      int32_t bufferKind, int32_t width, int32_t height);
+
+/* Reads a file of any type into a buffer of its own and converts it.
+ * mode           pixel type of the buffer: 0 U8, 4 RGB, with one of the bits 0x78 I16; otherwise
+ *                0xBFF6004E. Palette pictures come with their colours in mode 4, else as indices.
+ * outPixels      written, not null: pixel (0, 0); the buffer is the caller's until
+ *                Gen_FreeLoadedBuffer. Null for a picture without pixels.
+ * outWidth, outHeight  in pixels; outLineWidth pixels from one row to the next; outType the pixel
+ *                type. Each may be null.
+ * Returns 0, 0xBFF60005 null path, 0xBFF60006 null outPixels, 0xBFF60007 the file cannot be read,
+ * or not into this type, 0xBFF60003 no memory. On failure the outputs are unchanged. */
+ZQ_API ZqError ZQ_CALL Gen_LoadBuffer(const char* path, int32_t mode, void** outPixels,
+                                      int32_t* outWidth, int32_t* outHeight, int32_t* outLineWidth,
+                                      int32_t* outType);
+
+/* Frees such a buffer. Null, and an address that is no such buffer (any more), are ignored. Returns
+ * 0. */
+ZQ_API ZqError ZQ_CALL Gen_FreeLoadedBuffer(void* buffer);
+
+/* ---- Core functions for sibling libraries (by ordinal on Windows). They return a code and report
+ * nowhere. */
+
+/* As DF_WriteFile2, for an image handle, with the type by name or by code. */
+ZQ_API ZqError ZQ_CALL ZqWriteFileByName(const char* path, ZqImageHandle image,
+                                         const ZqWriteOptions* options, const char* typeName,
+                                         ZqArrayU32Handle* colourTable);
+ZQ_API ZqError ZQ_CALL ZqWriteFileByCode(const char* path, ZqImageHandle image,
+                                         const ZqWriteOptions* options, int32_t typeCode,
+                                         ZqArrayU32Handle* colourTable);
+
+/* Reads a file into an image, which takes the type and size that the file holds and keeps its
+ * border. Palette pictures become U8 indices. PNG of 16-bit grey becomes I16; samples above 32767
+ * come through with all samples moved down by 32768 (see ZqGetSampleOffset), and a write gives the
+ * file's samples back.
+ * path         borrowed; empty or null: -1074395989.
+ * raw          borrowed; may be null. With parameters present: -1074395991.
+ * typeName     written unless null: the type's name, padded with blanks to 8 characters; "xxx" when
+ *              nobody recognises the file.
+ * pixelFormat  written unless null: how the file holds its pixels: 0, 1, 2, 3 grey or indices of 1,
+ *              2, 4, 8 bits; 6 grey of 16 bits; 8, 12, 14, 18, 19 colour of 24, 32, 48 (the
+ *              machine's byte order), 48, 64 bits; 13 float; 15 complex; 17 HSL.
+ * colourTable  written unless null: 256 entries 0xAARRGGBB when the file has a palette (alpha 0
+ *              when it has no transparency, missing entries 0), else none.
+ * On failure the image is what it was. */
+ZQ_API ZqError ZQ_CALL ZqReadFile(ZqImageHandle image, const char* path, const ZqRawParameters* raw,
+                                  ZqStringHandle* typeName, int32_t* pixelFormat,
+                                  ZqArrayU32Handle* colourTable);
+
+/* Converts a picture into the type of `destination`, which gets the source's size and border. U8,
+ * I16, RGB and RGB (U64) convert into each other, every type into itself; -1074396077 for other
+ * pairs. An image converted into itself stays as it is. On failure the destination is what it
+ * was. */
+ZQ_API ZqError ZQ_CALL ZqConvertImage(ZqImageHandle source, ZqImageHandle destination);
+
+ZQ_END_C
+
+#endif
