@@ -29,7 +29,3 @@ function(zqvissvc_static_program target)
     target_include_directories(${target} PRIVATE ${PROJECT_SOURCE_DIR}/src)
   endif()
 endfunction()
-
-# A source for object libraries whose folder has none yet.
-set(ZQVISSVC_EMPTY ${PROJECT_BINARY_DIR}/generated/empty.cpp)
-file(CONFIGURE OUTPUT ${ZQVISSVC_EMPTY} CONTENT "extern int zqvissvc_empty;\n")
