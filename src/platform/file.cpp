@@ -11,14 +11,16 @@
 namespace zq::platform {
 namespace {
 
-// Leaves room for the dots and the suffix in the 255 bytes that file systems allow.
-constexpr std::size_t kLongestStem = 240;
-
+// ".target.1a2b3c"; for all but short names no longer than the target's, which may be as long as
+// the system allows.
 std::string sibling_name(const std::string& path, unsigned random) {
+    constexpr std::size_t kAdded = 8;
+    std::array<char, kAdded> suffix{};
+    std::snprintf(suffix.data(), suffix.size(), ".%06x", random & 0xFFFFFFU);
     const std::size_t folder = folder_length(path);
-    std::array<char, 8> suffix{};
-    std::snprintf(suffix.data(), suffix.size(), "%06x", random & 0xFFFFFFU);
-    return path.substr(0, folder) + '.' + path.substr(folder, kLongestStem) + '.' + suffix.data();
+    const std::size_t length = path.size() - folder;
+    const std::size_t kept = length > 2 * kAdded ? length - kAdded : length;
+    return path.substr(0, folder) + '.' + path.substr(folder, kept) + suffix.data();
 }
 
 }  // namespace

@@ -37,11 +37,21 @@ int errno_of(DWORD error) {
     }
 }
 
+HANDLE open_existing(const char* path, DWORD access) {
+    return CreateFileA(path, access, FILE_SHARE_READ | FILE_SHARE_WRITE | FILE_SHARE_DELETE,
+                       nullptr, OPEN_EXISTING, 0, nullptr);
+}
+
+bool is_write_protected(const char* path) {
+    const HANDLE handle = open_existing(path, GENERIC_WRITE);
+    if (handle == INVALID_HANDLE_VALUE) return errno_of(GetLastError()) == EACCES;
+    CloseHandle(handle);
+    return false;
+}
+
 // False for consoles, the null device and the like. A file that cannot be looked at is a file.
 bool is_on_disk(const char* path) {
-    const HANDLE handle =
-        CreateFileA(path, 0, FILE_SHARE_READ | FILE_SHARE_WRITE | FILE_SHARE_DELETE, nullptr,
-                    OPEN_EXISTING, 0, nullptr);
+    const HANDLE handle = open_existing(path, 0);
     if (handle == INVALID_HANDLE_VALUE) return true;
     const DWORD type = GetFileType(handle);
     CloseHandle(handle);
@@ -76,8 +86,7 @@ std::size_t folder_length(std::string_view path) {
 }
 
 std::FILE* create_new_file(const std::string& name, const std::string& model) {
-    const DWORD attributes = GetFileAttributesA(model.c_str());
-    if (attributes != INVALID_FILE_ATTRIBUTES && (attributes & FILE_ATTRIBUTE_READONLY) != 0) {
+    if (is_write_protected(model.c_str())) {
         errno = EACCES;
         return nullptr;
     }
