@@ -84,6 +84,7 @@ ZqAddPathProc FAddPath_EX = add_path;
 ZqDrawSBarProc DrawSBar_EX = draw_bar;
 ZqTrackSBarEventProc TrackSBarEvent_EX = track_bar;
 
+// NOLINTNEXTLINE(bugprone-macro-parentheses): a declared name takes none.
 #define ZQ_HOST_SLOT(name) decltype(name) name = nullptr
 ZQ_HOST_SLOT(FDestroyPath_EX);
 ZQ_HOST_SLOT(FGetSpecialDir_EX);

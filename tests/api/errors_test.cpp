@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 #include <zqvissvc/errors.h>
 
+#include <algorithm>
 #include <climits>
 #include <cstring>
 #include <string>
@@ -67,6 +68,15 @@ TEST_F(ErrorsTest, ComposesNameAndMessage) {
         EXPECT_EQ(ZqProcessResult(c.code, nullptr, c.function), c.code);
     }
     EXPECT_TRUE(boxes_.take().empty());
+}
+
+TEST_F(ErrorsTest, GivesANullSourceABlock) {
+    ZqErrorCluster error{};
+    EXPECT_EQ(ZqProcessResult(0, &error, kCreate), 0);
+    EXPECT_EQ(+error.source, nullptr) << "a null handle is empty as it is";
+    ZqProcessResult(-1074396120, &error, kCreate);
+    const refhost::Owned<ZqStringHandle> source(error.source);
+    EXPECT_EQ(refhost::text(source.get()), "KEMO Create\nNot an image.");
 }
 
 TEST_F(ErrorsTest, CallersNameIsCutAt64) {
@@ -198,7 +208,7 @@ TEST_F(ErrorsTest, ErrorTextCountsItsTerminator) {
 int32_t ZQ_CALL sibling_text(void* argument, int32_t id, char* text, int32_t capacity) {
     ++*static_cast<int*>(argument);
     std::memset(text, 'x', static_cast<size_t>(capacity));
-    if (id == 100) std::memcpy(text, "fine", 4);
+    if (id == 100) std::copy_n("fine", 4, text);
     return id == 100 ? 4 : id == 101 ? 0 : id == 7 ? capacity - 1 : capacity + 50;
 }
 
@@ -255,6 +265,7 @@ TEST_F(ErrorsTest, RefusesRangesThatCannotBe) {
 TEST_F(ErrorsTest, RegistrationIsSafeWhileOtherThreadsReport) {
     static int asked = 0;
     std::vector<std::thread> threads;
+    threads.reserve(4);
     for (int i = 0; i < 4; ++i) {
         threads.emplace_back([i] {
             for (int n = 0; n < 200; ++n) {

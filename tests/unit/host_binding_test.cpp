@@ -146,17 +146,20 @@ TEST_F(HostBindingTest, MissingSessionServiceIsAnErrorWithoutABox) {
     EXPECT_EQ(refhost::cleanup_procs(), 0U);
 }
 
-// One binding, threads with two different hosts: none may ever get the other's function.
+// One binding, threads that go from host to host: none may ever get the function of the other one.
 TEST_F(HostBindingThreadTest, EachThreadGetsItsOwnHostsFunction) {
     zqtest::ForeignSlot slot;
     SetDFRTTLSIndex(slot.index());
     std::atomic<int> wrong{0};
     std::vector<std::thread> threads;
+    threads.reserve(4);
     for (int i = 0; i < 4; ++i) {
         threads.emplace_back([&, i] {
-            slot.set(i % 2 == 0 ? program_ : other_);
-            const int expected = i % 2 == 0 ? 3 : answer_;
-            for (int call = 0; call < 5000; ++call) wrong += str_len("abc") != expected ? 1 : 0;
+            for (int call = 0; call < 50000; ++call) {
+                const bool in_program = (call >> i) % 2 == 0;
+                slot.set(in_program ? program_ : other_);
+                if (str_len("abc") != (in_program ? 3 : answer_)) ++wrong;
+            }
         });
     }
     for (std::thread& thread : threads) thread.join();
