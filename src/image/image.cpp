@@ -36,13 +36,8 @@ Image::Image(Variant variant, std::string_view name)
 }
 
 Image::~Image() {
-    if (external_count_ > 0 && source_ != BufferSource::kExternal) {
-        try {
-            LentBuffers::instance().adopt(record_.buffer, source_, external_count_);
-        } catch (...) {
-            // Out of memory: the buffer is lost rather than freed under its user.
-            source_ = BufferSource::kNone;
-        }
+    if (external_count_ > 0) {
+        LentBuffers::instance().orphan(handle(), record_.buffer, source_);
     } else {
         release_buffer();
     }
@@ -69,6 +64,7 @@ std::uint8_t* Image::lend() {
     if (external_count_ == std::numeric_limits<std::int32_t>::max()) {
         throw kSystemError;
     }
+    LentBuffers::instance().lend(handle(), record_.buffer);
     ++external_count_;
     return record_.buffer;
 }
@@ -76,6 +72,7 @@ std::uint8_t* Image::lend() {
 void Image::give_back() {
     if (external_count_ > 0) {
         --external_count_;
+        LentBuffers::instance().give_back(handle(), record_.buffer);
     }
 }
 

@@ -21,28 +21,58 @@ LentBuffers& LentBuffers::instance() {
     return the_buffers;
 }
 
+LentBuffers::LentBuffers() {
+    // Made before this object, these outlive it.
+    memory::prepare();
+    PhysicalMemory::instance();
+}
+
 LentBuffers::~LentBuffers() {
-    for (const auto& [buffer, orphan] : orphans_) {
-        free_buffer(buffer, orphan.source);
+    for (const auto& [key, loan] : loans_) {
+        free_buffer(key.second, loan.source);
     }
 }
 
-void LentBuffers::adopt(std::uint8_t* buffer, BufferSource source, std::int32_t users) {
+void LentBuffers::lend(const void* image, std::uint8_t* buffer) {
     const std::lock_guard lock(mutex_);
-    orphans_[buffer] = {source, users};
+    ++loans_[{image, buffer}].users;
 }
 
-bool LentBuffers::give_back(std::uint8_t* buffer) {
+bool LentBuffers::give_back(const void* image, std::uint8_t* buffer) noexcept {
     const std::lock_guard lock(mutex_);
-    const auto found = orphans_.find(buffer);
-    if (found == orphans_.end()) {
+    const auto found = loans_.find({image, buffer});
+    if (found == loans_.end()) {
         return false;
     }
-    if (--found->second.users == 0) {
-        free_buffer(buffer, found->second.source);
-        orphans_.erase(found);
-    }
+    end_one(found);
     return true;
+}
+
+bool LentBuffers::give_back_orphan(const void* image, std::uint8_t* buffer) noexcept {
+    const std::lock_guard lock(mutex_);
+    const auto found = loans_.find({image, buffer});
+    if (found == loans_.end() || found->second.source == BufferSource::kNone) {
+        return false;
+    }
+    end_one(found);
+    return true;
+}
+
+void LentBuffers::orphan(const void* image, std::uint8_t* buffer, BufferSource source) noexcept {
+    const std::lock_guard lock(mutex_);
+    const auto found = loans_.find({image, buffer});
+    if (found == loans_.end()) {
+        free_buffer(buffer, source);
+    } else if (source != BufferSource::kExternal) {
+        found->second.source = source;
+    }
+}
+
+void LentBuffers::end_one(Loans::iterator loan) noexcept {
+    if (--loan->second.users == 0) {
+        free_buffer(loan->first.second, loan->second.source);
+        loans_.erase(loan);
+    }
 }
 
 }  // namespace zq

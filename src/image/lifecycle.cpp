@@ -6,7 +6,7 @@
 #include <functional>
 #include <memory>
 
-#include "image/image_lock.h"
+#include "image/lent_buffers.h"
 #include "image/registry.h"
 
 namespace zq {
@@ -29,25 +29,25 @@ class ImageHandler final : public ObjectHandler {
 
 ImageHandler image_handler;
 
-using Shaper = std::function<void(Image&)>;
+using Use = std::function<void(Image&)>;
 
-// Shapes the image that has the name, under its lock; null when there is none, or it went away
+// Runs `use` on an image under its lock; null when the pin is empty or the image went away
 // meanwhile.
-ImageHandle reshape_existing(std::string_view name, const Shaper& shape) {
-    const Pin pin = Registry::instance().find(name, kImageTag);
-    if (!pin || !pin.gate->lock()) {
+ImageHandle use_if_live(const Pin& pin, const Use& use) {
+    if (!pin || pin.tag != kImageTag || !pin.gate->lock()) {
         return nullptr;
     }
     const std::unique_ptr<ObjectGate, void (*)(ObjectGate*)> unlock(
         pin.gate.get(), [](ObjectGate* gate) { gate->unlock(); });
     auto* image = static_cast<Image*>(pin.object);
-    shape(*image);
+    use(*image);
     return image->handle();
 }
 
-Created find_or_create(std::string_view name, Variant variant, const Shaper& shape) {
+Created find_or_create(std::string_view name, Variant variant, const Use& shape) {
     for (;;) {
-        if (const ImageHandle found = reshape_existing(name, shape)) {
+        const Pin pin = Registry::instance().find(name, kImageTag);
+        if (const ImageHandle found = use_if_live(pin, shape)) {
             return {found, false};
         }
         auto image = std::make_unique<Image>(variant, name);
@@ -75,6 +75,17 @@ Created new_external_image(const ImageShape& shape, std::uint8_t* buffer, std::i
                            std::string_view name) {
     return find_or_create(name, Variant::kRegistered,
                           [&](Image& image) { image.wrap_external(shape, buffer, row_pixels); });
+}
+
+bool take_back_buffer(ImageHandle handle, std::uint8_t* buffer) {
+    LentBuffers& lent = LentBuffers::instance();
+    // First, because a new image may have the handle of the one that is gone.
+    if (lent.give_back_orphan(handle, buffer)) {
+        return true;
+    }
+    const Pin pin = Registry::instance().pin(Image::object_address(handle));
+    return use_if_live(pin, [](Image& image) { image.give_back(); }) != nullptr ||
+           lent.give_back(handle, buffer);
 }
 
 void dispose_image(ImageHandle handle) {

@@ -27,8 +27,12 @@ Created new_named_image(const ImageShape& shape, std::string_view name, Variant 
 // As new_named_image, but the pixels are the caller's buffer, which must outlive its use by the
 // image and is never freed here. A later change of size gives the image a buffer of its own and
 // leaves the caller's alone. Also throws kExternalBufferAlignment and kNullPointer.
-Created new_external_image(const ImageShape& shape, std::uint8_t* buffer,
-                               std::int32_t row_pixels, std::string_view name);
+Created new_external_image(const ImageShape& shape, std::uint8_t* buffer, std::int32_t row_pixels,
+                           std::string_view name);
+
+// Takes back a buffer that `handle` lent: from the image while it lives, else from the buffer's
+// remaining users. False when there is no such image and it has lent no such buffer.
+bool take_back_buffer(ImageHandle handle, std::uint8_t* buffer);
 
 // Waits for operations under way on the image. A null handle or one that is not (any more)
 // registered is no error.
