@@ -46,6 +46,12 @@ Mode current_mode(HostRoutine& routine) {
     return choice().mode;
 }
 
+// A copy: the host's code runs without the mutex.
+HostRoutine chosen_routine() {
+    const std::lock_guard lock(choice().mutex);
+    return choice().routine;
+}
+
 void* raw_allocate(Mode mode, const HostRoutine& routine, std::size_t bytes) {
     void* raw = nullptr;
     switch (mode) {
@@ -78,6 +84,11 @@ void* finish(void* raw, Mode mode, std::size_t bytes) {
 }
 
 }  // namespace
+
+void prepare() {
+    choice();
+    MemoryPool::instance();
+}
 
 void set_mode(Mode mode, const HostRoutine* routine) {
     if (mode == Mode::kHostRoutine &&
@@ -133,11 +144,10 @@ void release(void* block) noexcept {
         return;
     }
     Header* header = header_of(block);
-    if (MemoryPool::instance().bytes_behind(block) != 0) {
+    if (MemoryPool::instance().bytes_behind(header) != 0) {
         MemoryPool::instance().give_back(header);
     } else if (header->source == static_cast<std::uint32_t>(Mode::kHostRoutine)) {
-        const std::lock_guard lock(choice().mutex);
-        choice().routine.release(header);
+        chosen_routine().release(header);
     } else {
         std::free(header);
     }

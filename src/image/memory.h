@@ -22,6 +22,10 @@ struct HostRoutine {
 // kInvalidParameter. Threads: safe against running allocations.
 void set_mode(Mode mode, const HostRoutine* routine);
 
+// Makes the process-wide state. Whoever releases blocks while the process ends calls this when it
+// is made itself, so that the state is still there.
+void prepare();
+
 // Both throw kNotEnoughMemory, or kPoolExhausted while the pool serves. Blocks are aligned to 8
 // bytes.
 void* allocate(std::size_t bytes);

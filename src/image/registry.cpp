@@ -8,8 +8,6 @@
 #include <utility>
 
 #include "image/lent_buffers.h"
-#include "image/memory_pool.h"
-#include "image/physical_memory.h"
 #include "platform/thread.h"
 
 namespace zq {
@@ -66,10 +64,8 @@ Registry& Registry::instance() {
 }
 
 Registry::Registry() {
-    // Made before the registry, these outlive it: the images that are left at the end still need
-    // them.
-    MemoryPool::instance();
-    PhysicalMemory::instance();
+    // Made before the registry, they and what they need outlive it: the images that are left at the
+    // end still give back their buffers.
     LentBuffers::instance();
 }
 
