@@ -125,7 +125,7 @@ ZqError ZQ_CALL ZqDisposeImage(ZqImageHandle image) {
 ZqError ZQ_CALL ZqFindImage(const char* name, ZqImageHandle* image) {
     return host::run_core([&] {
         const Pin pin = Registry::instance().find(text_of(name), kImageTag);
-        required(image) = pin ? static_cast<Image*>(pin.object)->handle() : nullptr;
+        required(image) = pin ? Image::handle_of(pin.object) : nullptr;
     });
 }
 

@@ -50,6 +50,11 @@ class Image final : public Object {
     }
     const std::shared_ptr<ObjectGate>& gate() const override { return gate_; }
     ImageHandle handle() { return &record_; }
+    // The handle of an image that may be gone by now; arithmetic only.
+    static ImageHandle handle_of(const Object* image) {
+        return reinterpret_cast<ImageHandle>(reinterpret_cast<std::uintptr_t>(image) +
+                                             sizeof(void*));
+    }
 
     const ImageRecord& record() const { return record_; }
     ImageRecord& record() { return record_; }
@@ -60,7 +65,8 @@ class Image final : public Object {
 
     // Shape. All of them throw kImageLent while the buffer is lent out, kNotEnoughMemory,
     // kPoolExhausted or kMemoryError; a failed resize leaves the image as it was, but for
-    // kPhysical, which then leaves it without pixels. reinitialise also throws kInvalidImageType
+    // kPhysical: when the allocator is there but refuses, the image is left without pixels.
+    // reinitialise also throws kInvalidImageType
     // and then leaves the image without pixels.
     void reinitialise(const ImageShape& shape);
     void resize(std::int32_t width, std::int32_t height, std::optional<std::int32_t> new_type,

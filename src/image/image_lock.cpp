@@ -60,18 +60,13 @@ void lock_images(std::span<const ImageHandle> images) {
     lock.keep();
 }
 
-void unlock_images(std::span<const ImageHandle> images) {
-    std::vector<std::shared_ptr<ObjectGate>> gates;
-    gates.reserve(images.size());
-    for (const ImageHandle handle : images) {
-        if (Pin pin = Registry::instance().pin(Image::object_address(handle));
-            pin && pin.tag == kImageTag) {
-            gates.push_back(std::move(pin.gate));
+void unlock_images(std::span<const ImageHandle> images) noexcept {
+    // Without a list of its own: unlocking works without memory.
+    for (auto each = images.begin(); each != images.end(); ++each) {
+        const Pin pin = Registry::instance().pin(Image::object_address(*each));
+        if (pin && pin.tag == kImageTag && std::find(images.begin(), each, *each) == each) {
+            pin.gate->unlock();
         }
-    }
-    order(gates);
-    for (const auto& gate : gates) {
-        gate->unlock();
     }
 }
 
