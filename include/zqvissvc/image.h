@@ -162,9 +162,9 @@ ZQ_API ZqError ZQ_CALL ZqLockImages(const ZqImageHandle* images, int32_t count);
 ZQ_API ZqError ZQ_CALL ZqUnlockImages(const ZqImageHandle* images, int32_t count);
 
 /* Resizes, to `type` when changeType is not 0. mode 0 plain; 1 keeps the rows when only the height
- * changes; 2 takes the buffer from physically contiguous memory (-1074396158 when there is none;
- * the image then has no pixels). -1074395997 for another mode. A failed resize in modes 0 and 1
- * leaves the image as it was. */
+ * changes; 2 takes the buffer from physically contiguous memory: -1074396158 when its allocator is
+ * missing, or has none left; the image then has no pixels. -1074395997 for another mode. Any other
+ * failed resize leaves the image as it was. */
 ZQ_API ZqError ZQ_CALL ZqResizeImage(ZqImageHandle image, int32_t width, int32_t height,
                                      uint8_t changeType, int32_t type, int32_t mode);
 

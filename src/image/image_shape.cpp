@@ -130,29 +130,23 @@ void Image::reshape_in_memory_layer(const Extent& target, const Layout& layout, 
     const Extent old = extent();
     const bool in_place = source_ == BufferSource::kMemoryLayer;
     const std::ptrdiff_t old_offset =
-        record_.buffer == nullptr
-            ? 0
-            : top_left(record_.firstPixel, old, record_.rowPixels) - record_.buffer;
+        in_place ? top_left(record_.firstPixel, old, record_.rowPixels) - record_.buffer : 0;
     auto* buffer =
         static_cast<std::uint8_t*>(in_place ? memory::resize(record_.buffer, layout.buffer_bytes)
                                             : memory::allocate(layout.buffer_bytes));
     std::uint8_t* first = place_first_pixel(buffer, target, layout.row_pixels);
-    if (keep && record_.buffer != nullptr) {
-        const std::uint8_t* from = (in_place ? buffer : record_.buffer) + old_offset;
-        std::uint8_t* to = top_left(first, target, layout.row_pixels);
-        if (layout.row_pixels == record_.rowPixels) {
-            std::memmove(to, from,
-                         std::min(bytes_of_rows(old, record_.rowPixels),
-                                  bytes_of_rows(target, layout.row_pixels)));
-        } else {
-            // Only an external buffer has another row distance than the library's own, and it is
-            // never moved in place.
-            const std::int32_t pixel_bytes = bytes_per_pixel(old.type);
-            copy_rows(to, std::ptrdiff_t{layout.row_pixels} * pixel_bytes, from, row_stride(),
-                      std::min(old.height, target.height) + 2 * old.border,
-                      static_cast<std::size_t>(std::min(layout.row_pixels, record_.rowPixels)) *
-                          static_cast<std::size_t>(pixel_bytes));
-        }
+    if (keep && in_place) {
+        std::memmove(top_left(first, target, layout.row_pixels), buffer + old_offset,
+                     std::min(bytes_of_rows(old, record_.rowPixels),
+                              bytes_of_rows(target, layout.row_pixels)));
+    } else if (keep && record_.buffer != nullptr) {
+        // Pixel by pixel: an external buffer may have another row distance, and may end with the
+        // last pixel of its last row.
+        const std::ptrdiff_t pixel_bytes = bytes_per_pixel(old.type);
+        copy_rows(top_left(first, target, layout.row_pixels), layout.row_pixels * pixel_bytes,
+                  top_left(record_.firstPixel, old, record_.rowPixels), row_stride(),
+                  std::min(old.height, target.height) + 2 * old.border,
+                  static_cast<std::size_t>((old.width + 2 * old.border) * pixel_bytes));
     }
     if (!in_place) {
         release_buffer();
@@ -247,7 +241,7 @@ void Image::wrap_external(const ImageShape& shape, std::uint8_t* buffer, std::in
     record_.buffer = buffer;
     source_ = BufferSource::kExternal;
     settle(target, row);
-    record_.firstPixel = buffer + (std::ptrdiff_t{row} + 1) * target.border * pixel_bytes;
+    record_.firstPixel = buffer + (std::int64_t{row} + 1) * target.border * pixel_bytes;
 }
 
 void Image::adopt(Image& source) {
