@@ -41,6 +41,14 @@ void describe(const ImageRecord& record, const Description& out) {
     put(out.y_step, record.yStep);
 }
 
+// Coordinates are not checked, so the count may not fit its 32 bits; it then wraps.
+std::int32_t remaining_bytes(const ImageRecord& record, std::int32_t x, std::int32_t y,
+                             std::int32_t pixel_bytes) {
+    const auto word = [](std::int32_t value) { return static_cast<std::uint32_t>(value); };
+    const std::uint32_t pixels = (word(record.height) - word(y)) * word(record.rowPixels) - word(x);
+    return static_cast<std::int32_t>(pixels * word(pixel_bytes));
+}
+
 void set_size(Image& image, std::int32_t width, std::int32_t height) {
     GRLIBError_enum result = kSuccess;
     try {
@@ -165,11 +173,10 @@ ZqError ZQ_CALL DF_GetImagePixelPtr(const ZqImageValue* image, int32_t x, int32_
             put<void*>(pixel, locked->pixel(x, y));
         }
         const std::int32_t pixel_bytes = bytes_per_pixel(locked->type());
-        const std::int64_t rows = std::int64_t{record.height} - y;
         put(border, record.border);
         put(lineWidth, record.rowPixels);
         put(bytesPerPixel, pixel_bytes);
-        put(remainingBytes, static_cast<std::int32_t>((rows * record.rowPixels - x) * pixel_bytes));
+        put(remainingBytes, remaining_bytes(record, x, y, pixel_bytes));
     });
 }
 

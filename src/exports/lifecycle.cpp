@@ -9,7 +9,6 @@
 #include "host/image_value.h"
 #include "host/run_hooks.h"
 #include "image/image_lock.h"
-#include "image/lent_buffers.h"
 #include "image/lifecycle.h"
 #include "image/memory_pool.h"
 
@@ -27,9 +26,6 @@ std::string_view name_of(ZqStringHandle name) {
 // Hands a created image to the host: as a session, as a value, and for disposal at tear-down when
 // it has no name to be found by again. A new image that the host does not take is released again.
 void publish(const Created& created, ZqStringHandle name, ZqImageValue* value) {
-    if (value == nullptr) {
-        throw kNullPointer;
-    }
     host::register_session(created.image, name);
     if (name_of(name).empty()) {
         host::dispose_at_teardown(created.image);
@@ -40,6 +36,9 @@ void publish(const Created& created, ZqStringHandle name, ZqImageValue* value) {
 
 template <class Create>
 void create_and_publish(ZqStringHandle name, ZqImageValue* value, Create create) {
+    if (value == nullptr) {
+        throw kNullPointer;
+    }
     const Created created = create(name_of(name));
     try {
         publish(created, name, value);
@@ -121,8 +120,8 @@ ZqError ZQ_CALL Gen_MarkExternalBuffer(const ZqImageValue* image, uint8_t mark, 
         }
         if (mark != 0) {
             *buffer = LockedImage(host::require_image(image))->lend();
-        } else if (!LentBuffers::instance().give_back(static_cast<std::uint8_t*>(*buffer))) {
-            LockedImage(host::require_image(image))->give_back();
+        } else if (!take_back_buffer(image->image, static_cast<std::uint8_t*>(*buffer))) {
+            throw kNotAnImage;
         }
     });
 }

@@ -36,6 +36,7 @@ void clear_name(ZqImageValue& value) {
 void unregister(const ZqImageValue& value) {
     const auto unregister_value = host::ud_unregister_session.require();
     unregister_value(host::kSessionType, &value);
+    host::set_cookie(value.image, 0);
 }
 
 }  // namespace
@@ -96,9 +97,12 @@ ZqError ZQ_CALL DF_ImageToDFDT(const ZqImageValue* cluster, ZqImageValue* value)
         }
         const bool was_live = value->image != nullptr && host::look_up(value).code == kSuccess;
         if (was_live) {
-            unregister(*value);
+            host::require_image(cluster);
         }
         host::copy_string(&value->name, cluster->name);
+        if (was_live) {
+            unregister(*value);
+        }
         value->image = cluster->image;
         if (was_live) {
             host::register_session(value->image, value->name);

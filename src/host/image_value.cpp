@@ -3,6 +3,7 @@
 
 #include <utility>
 
+#include "host/boundary.h"
 #include "host/run_hooks.h"
 #include "host/services.h"
 #include "image/image_lock.h"
@@ -28,7 +29,9 @@ void dispose_from_host(void* image) {
 void leave_host(Image& image) noexcept {
     remove_session(std::exchange(image.record().hostCookie, 0));
     if (image.has_cleanup_procedure()) {
-        remove_cleanup_procedure(dispose_from_host, image.handle());
+        // Only fails when this thread's first call comes without memory; the host then calls for an
+        // image that is gone.
+        run_core([&] { remove_cleanup_procedure(dispose_from_host, image.handle()); });
     }
 }
 
