@@ -350,9 +350,10 @@ TEST_F(PngFilesTest, CompressesAsTheSettingSays) {
         const std::string stream = chunk_bytes(load_bytes(path_), "IDAT");
         EXPECT_EQ(stream.size() > 64 * 65, c.stored);
         std::string rows(64 * 65, '\0');
-        uLongf length = rows.size();
+        auto length = static_cast<uLongf>(rows.size());
         ASSERT_EQ(uncompress(reinterpret_cast<Bytef*>(rows.data()), &length,
-                             reinterpret_cast<const Bytef*>(stream.data()), stream.size()),
+                             reinterpret_cast<const Bytef*>(stream.data()),
+                             static_cast<uLong>(stream.size())),
                   Z_OK);
         for (size_t y = 1; y < 64; ++y) ASSERT_EQ(rows[y * 65], c.filter) << "row " << y;
     }

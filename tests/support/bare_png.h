@@ -89,7 +89,7 @@ inline std::string png_chunk(const std::string& name, const std::string& bytes) 
     const std::string body = name + bytes;
     const uLong sum =
         crc32(0, reinterpret_cast<const Bytef*>(body.data()), static_cast<uInt>(body.size()));
-    return big_endian(bytes.size()) + body + big_endian(sum);
+    return big_endian(static_cast<uLong>(bytes.size())) + body + big_endian(sum);
 }
 
 // Contents of all chunks of a name, joined; empty when there is none.
