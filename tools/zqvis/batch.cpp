@@ -1,0 +1,68 @@
+// Progress and reports of a batch.
+#include "batch.h"
+
+#include <fmt/core.h>
+#include <zqvissvc/errors.h>
+
+#include <cstdio>
+#include <new>
+
+#include "console.h"
+#include "failure.h"
+
+namespace {
+
+class ProgressBar {
+  public:
+    ProgressBar(size_t total, bool wanted)
+        : total_(total), shown_(wanted && total > 1 && is_terminal(stderr)) {}
+
+    void show(size_t done, const std::string& file) const {
+        if (!shown_) return;
+        constexpr size_t kWidth = 30;
+        const size_t filled = done * kWidth / total_;
+        fmt::print(stderr, "\r\033[K[{:#<{}}{:.<{}}] {}/{} {}", "", filled, "", kWidth - filled,
+                   done, total_, file);
+        std::fflush(stderr);
+    }
+
+    // Makes the line free for other text.
+    void clear() const {
+        if (shown_) fmt::print(stderr, "\r\033[K");
+    }
+
+  private:
+    size_t total_;
+    bool shown_;
+};
+
+void report(const std::string& file, ZqError code) {
+    fmt::print(stderr, "zqvis: {}: {} ({})\n", file, message_of(code), code);
+}
+
+}  // namespace
+
+int run_batch(const std::vector<std::string>& files, bool quiet,
+              const std::function<std::string(const std::string&)>& work) {
+    const ProgressBar bar(files.size(), !quiet);
+    int status = kDone;
+    const auto fail = [&](const std::string& file, ZqError code) {
+        bar.clear();
+        report(file, code);
+        status = kFailed;
+    };
+    for (size_t i = 0; i < files.size(); ++i) {
+        bar.show(i, files[i]);
+        try {
+            const std::string text = work(files[i]);
+            bar.clear();
+            fmt::print("{}", text);
+        } catch (const Failure& failure) {
+            fail(failure.file().empty() ? files[i] : failure.file(), failure.code());
+        } catch (const std::bad_alloc&) {
+            fail(files[i], ZQ_ERR_NOT_ENOUGH_MEMORY);
+        }
+    }
+    if (std::fflush(stdout) != 0) fail("standard output", ZQ_ERR_UNABLE_TO_WRITE_DATA);
+    return status;
+}

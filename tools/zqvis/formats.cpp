@@ -1,0 +1,54 @@
+// The table of file types that the tool can ask the library for. Whether the library has them is
+// the library's to say.
+#include "formats.h"
+
+#include <algorithm>
+#include <array>
+#include <filesystem>
+
+namespace {
+
+constexpr std::array kFormats = {
+    Format{"BMP", ".bmp", true},  Format{"AIPD", ".aipd", false},
+    Format{"TIFF", ".tif", true}, Format{"JPEG", ".jpg", false},
+    Format{"PNG", ".png", true},  Format{"JPEG2000", ".jp2", false},
+};
+
+struct Alias {
+    const char* extension;
+    const char* name;
+};
+constexpr std::array kAliases = {Alias{".tiff", "TIFF"}, Alias{".jpeg", "JPEG"},
+                                 Alias{".apd", "AIPD"}};
+
+char lower(char c) {
+    return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
+}
+
+bool equal_but_for_case(std::string_view a, std::string_view b) {
+    return std::ranges::equal(a, b, {}, lower, lower);
+}
+
+}  // namespace
+
+std::vector<std::string> format_names() {
+    std::vector<std::string> names;
+    names.reserve(kFormats.size());
+    for (const Format& format : kFormats) names.emplace_back(format.name);
+    return names;
+}
+
+const Format* find_format(std::string_view name) {
+    const auto* const found = std::ranges::find_if(
+        kFormats, [name](const Format& format) { return equal_but_for_case(format.name, name); });
+    return found == kFormats.end() ? nullptr : found;
+}
+
+const Format* format_of_path(const std::string& path) {
+    const std::string extension = std::filesystem::path(path).extension().string();
+    for (const Format& format : kFormats)
+        if (equal_but_for_case(format.extension, extension)) return &format;
+    for (const Alias& alias : kAliases)
+        if (equal_but_for_case(alias.extension, extension)) return find_format(alias.name);
+    return nullptr;
+}

@@ -1,0 +1,69 @@
+// A picture in the library: an image with its colour table, created, read, converted and written
+// through the exported functions as any host would do it.
+#ifndef ZQVIS_PICTURE_H
+#define ZQVIS_PICTURE_H
+
+#include <zqvissvc/files.h>
+#include <zqvissvc/types.h>
+
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <span>
+#include <string>
+#include <vector>
+
+#include "refhost/refhost.h"
+
+// What an image is, apart from its pixels.
+struct Facts {
+    int32_t type = ZQ_TYPE_U8;
+    int32_t width = 0;
+    int32_t height = 0;
+    int32_t unit = 0;
+    float x_step = 1;
+    float y_step = 1;
+    int32_t bit_depth = 0;  // 0: not set
+    int32_t sample_offset = 0;
+};
+
+class Picture {
+  public:
+    // An image without name and border.
+    Picture(int32_t type, int32_t width, int32_t height);
+    // The file's image, of the type that the file holds.
+    explicit Picture(const std::string& path);
+    Picture(const Picture&) = delete;
+    Picture& operator=(const Picture&) = delete;
+    ~Picture();
+
+    Facts facts() const;
+    const std::string& file_type() const { return file_type_; }  // empty unless it was read
+
+    // 256 entries 0xAARRGGBB, or none.
+    std::vector<uint32_t> colour_table() const { return colour_table_.elements(); }
+
+    // Row y of the image proper, as stored, without padding. Valid while the picture lives.
+    std::span<uint8_t> row(int32_t y) const;
+
+    // Each returns a new picture with the same calibration.
+    std::unique_ptr<Picture> with_colours_applied() const;  // RGB, by the colour table
+    std::unique_ptr<Picture> converted(int32_t type) const;
+
+    // Writes the image with its colour table. The path serves for reports too.
+    void write(const std::string& path, const std::string& file_type,
+               const ZqWriteOptions& options);
+
+  private:
+    void copy_attributes(const Facts& from) const;
+
+    ZqImageValue value_ = {};
+    refhost::ArrayU32 colour_table_;
+    std::string file_type_;
+};
+
+// Bytes of a pixel, 0 for a type that does not exist.
+size_t bytes_per_pixel(int32_t type);
+
+#endif
