@@ -5,7 +5,6 @@
 
 #include "base/checked.h"
 #include "files/code_of.h"
-#include "files/lines.h"
 #include "platform/string_resource.h"
 
 namespace zq {
@@ -74,7 +73,8 @@ void ImageFileHandler::read_through_staging(Image& target, const Accept& accept,
 }
 
 void ImageFileHandler::read_lines(Image& image) {
-    zq::read_lines(input(), image, header_.bytes_per_line());
+    const auto rows = static_cast<std::size_t>(image.record().height);
+    input().read_rows({image.row(0), image.row_stride(), header_.bytes_per_line(), rows});
 }
 
 GRLIBError_enum ImageFileHandler::write(const char* path, const WriteJob& job) noexcept {
@@ -96,7 +96,9 @@ void ImageFileHandler::write_steps(const char* path) {
 }
 
 void ImageFileHandler::write_lines() {
-    zq::write_lines(output(), job().pixels, header_.bytes_per_line());
+    const PixelView& pixels = job().pixels;
+    const auto rows = static_cast<std::size_t>(pixels.height);
+    output_->write_rows({pixels.first, pixels.stride, header_.bytes_per_line(), rows});
 }
 
 }  // namespace zq

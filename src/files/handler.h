@@ -68,7 +68,8 @@ class ImageFileHandler {
     // Whether lines may be read straight into a target that already has the file's shape, because
     // nothing but a failing disk can stop them.
     virtual bool may_read_in_place() const { return false; }
-    // The image has the header's type and size.
+    // The image has the header's type and size. Here and in write_lines: as many bytes a line as
+    // the header says, top line first, nothing between lines, and nothing behind the last.
     virtual void read_lines(Image& image);
 
     // Writing, in this order. check_job throws for what the format cannot hold, before any file is

@@ -2,7 +2,6 @@
 #include "files/input_file.h"
 
 #include <cerrno>
-#include <utility>
 
 #include "base/checked.h"
 #include "files/stdio_errors.h"
@@ -10,24 +9,11 @@
 
 namespace zq {
 
-namespace {
-
-Stream open_for_reading(const char* path) {
-    Stream stream(platform::open_file(path, "rb"));
-    if (!stream) throw code_of_errno(errno);
-    return stream;
-}
-
-}  // namespace
-
-InputFile::InputFile(const char* path) : InputFile(open_for_reading(path), kUnknownSize) {
+InputFile::InputFile(const char* path)
+    : buffer_(std::make_unique<char[]>(kStreamBuffer)), stream_(platform::open_file(path, "rb")) {
+    if (!stream_) throw code_of_errno(errno);
     size_ = platform::regular_size(stream_.get());
-}
-
-InputFile::InputFile(Stream stream, std::int64_t size)
-    : buffer_(std::make_unique<char[]>(kStreamBuffer)), stream_(std::move(stream)), size_(size) {
-    // Refused only for lack of memory of the C library's own; reading then goes on with its
-    // default.
+    // Refused only for lack of memory of the C library's own; it then goes on with its default.
     std::setvbuf(stream_.get(), buffer_.get(), _IOFBF, kStreamBuffer);
 }
 
@@ -51,6 +37,10 @@ void InputFile::read(void* bytes, std::size_t count, GRLIBError_enum short_read)
 void InputFile::read_header_bytes(void* bytes, std::size_t count) {
     if (read_some(bytes, count) == count) return;
     throw code_of_errno(std::ferror(stream_.get()) != 0 ? errno : 0);
+}
+
+void InputFile::read_rows(platform::Rows<std::uint8_t> rows) {
+    if (!platform::read_rows(stream_.get(), rows)) throw kUnableToReadData;
 }
 
 void InputFile::require(std::uint64_t offset, std::uint64_t count) const {

@@ -8,6 +8,7 @@
 
 #include "base/error_codes.h"
 #include "files/stream.h"
+#include "platform/row_io.h"
 
 namespace zq {
 
@@ -15,9 +16,8 @@ class InputFile {
   public:
     // Throws the mapped error number when the path cannot be opened.
     explicit InputFile(const char* path);
-    // Takes an open stream of `size` bytes; kUnknownSize when that cannot be told.
-    InputFile(Stream stream, std::int64_t size);
 
+    // In bytes; kUnknownSize for what is no regular file.
     static constexpr std::int64_t kUnknownSize = -1;
     std::int64_t size() const { return size_; }
 
@@ -33,6 +33,9 @@ class InputFile {
     // All of them, or the mapped error number is thrown (end of file: kFileIo).
     void read_header_bytes(void* bytes, std::size_t count);
 
+    // All rows from here on, or kUnableToReadData is thrown; nothing else can be read then.
+    void read_rows(platform::Rows<std::uint8_t> rows);
+
     // Throws kUnableToReadData when the file is known to end before `offset` + `count`. What a
     // header announces goes through here before memory is taken for it.
     void require(std::uint64_t offset, std::uint64_t count) const;
@@ -41,7 +44,7 @@ class InputFile {
     // Declared before the stream, which uses it until it is closed.
     std::unique_ptr<char[]> buffer_;
     Stream stream_;
-    std::int64_t size_;
+    std::int64_t size_ = kUnknownSize;
 };
 
 }  // namespace zq

@@ -43,6 +43,10 @@ void OutputFile::write(const void* bytes, std::size_t count) {
     if (!try_write(bytes, count)) throw last_error_;
 }
 
+void OutputFile::write_rows(platform::Rows<const std::uint8_t> rows) {
+    if (!platform::write_rows(stream_.get(), rows)) throw code_of_errno(errno);
+}
+
 bool OutputFile::close() noexcept {
     return !stream_ || std::fclose(stream_.release()) == 0;
 }

@@ -9,6 +9,7 @@
 
 #include "base/error_codes.h"
 #include "files/stream.h"
+#include "platform/row_io.h"
 
 namespace zq {
 
@@ -26,8 +27,9 @@ class OutputFile {
     bool try_flush() noexcept;
     GRLIBError_enum last_error() const { return last_error_; }
 
-    // Throws the mapped error number.
+    // Throw the mapped error number. Nothing can be written behind rows.
     void write(const void* bytes, std::size_t count);
+    void write_rows(platform::Rows<const std::uint8_t> rows);
 
     // Closes the file and puts it in its place. Throws the mapped error number; the place then
     // holds what it held before.
