@@ -1,0 +1,4 @@
+// Runs all benchmarks of the program.
+#include <benchmark/benchmark.h>
+
+BENCHMARK_MAIN();
