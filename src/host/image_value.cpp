@@ -76,8 +76,9 @@ void register_session(ImageHandle image, ZqStringHandle name) {
     const auto register_value = ud_register_session.require();
     const ZqImageValue value = {name, image};
     std::uint32_t cookie = 0;
-    if (register_value(kSessionType, &value, &cookie) != 0) {
-        throw kSystemError;
+    const std::int32_t status = register_value(kSessionType, &value, &cookie);
+    if (status != 0) {
+        throw status == kHostOutOfMemory ? kNotEnoughMemory : kSystemError;
     }
     std::uint32_t old_cookie = 0;
     try {

@@ -26,7 +26,7 @@ ImageHandle require_image(const ZqImageValue* value);
 
 // Registers an image with the host under a name and remembers the cookie in the image; a session
 // that the image had is removed. Throws kNotInitialized when the host lacks the service,
-// kSystemError when it refuses.
+// kNotEnoughMemory when it has no memory, kSystemError when it refuses for another reason.
 void register_session(ImageHandle image, ZqStringHandle name);
 
 // Makes the host dispose the image when it tears the caller down.
