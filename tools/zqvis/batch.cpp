@@ -21,17 +21,20 @@ class ProgressBar {
         if (!shown_) return;
         constexpr size_t kWidth = 30;
         const size_t filled = done * kWidth / total_;
-        fmt::print(stderr, "\r\033[K[{:#<{}}{:.<{}}] {}/{} {}", "", filled, "", kWidth - filled,
-                   done, total_, file);
+        const std::string line = fmt::format("[{:#<{}}{:.<{}}] {}/{} {}", "", filled, "",
+                                             kWidth - filled, done, total_, file);
+        fmt::print(stderr, "\r{:<{}.{}}", line, kColumns, kColumns);
         std::fflush(stderr);
     }
 
     // Makes the line free for other text.
     void clear() const {
-        if (shown_) fmt::print(stderr, "\r\033[K");
+        if (shown_) fmt::print(stderr, "\r{:{}}\r", "", kColumns);
     }
 
   private:
+    static constexpr size_t kColumns = 79;  // one less than the narrowest terminal has
+
     size_t total_;
     bool shown_;
 };

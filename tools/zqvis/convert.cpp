@@ -114,8 +114,9 @@ void convert(const std::string& file, const Options& options, const Format& form
     const Input input(file);
     const std::unique_ptr<Picture> picture = read(input.path(), options, format);
     const ZqWriteOptions written = write_options(options, format.name);
-    write_through_path(output_of(options, format, file), [&](const std::string& path) {
-        picture->write(path, format.name, written);
+    const std::string output = output_of(options, format, file);
+    write_through_path(output, [&](const std::string& path) {
+        check(picture->write(path, format.name, written), name_for_reports(output));
     });
 }
 

@@ -14,6 +14,9 @@ int run(int argc, char** argv) {
     tool.add_flag("--quiet", session.quiet, "No progress bar");
     tool.require_subcommand(1);
     tool.fallthrough();
+    tool.failure_message([](const CLI::App* /*app*/, const CLI::Error& error) {
+        return std::string("zqvis: ") + error.what() + "\nRun with --help for more information.\n";
+    });
     add_info(tool, session);
     add_convert(tool, session);
     add_dump(tool, session);

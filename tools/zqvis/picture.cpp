@@ -85,9 +85,8 @@ void Picture::copy_attributes(const Facts& from) const {
     if (keep_depth) check(DF_ImageBitDepth2(&value_, 1, &depth, nullptr));
 }
 
-void Picture::write(const std::string& path, const std::string& file_type,
-                    const ZqWriteOptions& options) {
-    check(DF_WriteFile2(&value_, path.c_str(), file_type.c_str(), colour_table_.out(), &options,
-                        nullptr),
-          path);
+ZqError Picture::write(const std::string& path, const std::string& file_type,
+                       const ZqWriteOptions& options) {
+    return DF_WriteFile2(&value_, path.c_str(), file_type.c_str(), colour_table_.out(), &options,
+                         nullptr);
 }

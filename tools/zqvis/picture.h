@@ -51,9 +51,9 @@ class Picture {
     std::unique_ptr<Picture> with_colours_applied() const;  // RGB, by the colour table
     std::unique_ptr<Picture> converted(int32_t type) const;
 
-    // Writes the image with its colour table. The path serves for reports too.
-    void write(const std::string& path, const std::string& file_type,
-               const ZqWriteOptions& options);
+    // Writes the image with its colour table; returns the library's code.
+    ZqError write(const std::string& path, const std::string& file_type,
+                  const ZqWriteOptions& options);
 
   private:
     void copy_attributes(const Facts& from) const;

@@ -42,6 +42,10 @@ void copy(std::FILE* from, std::FILE* to, const std::string& report_as) {
 
 }  // namespace
 
+std::string name_for_reports(const std::string& output) {
+    return output == kStandardStream ? "standard output" : output;
+}
+
 TemporaryFolder::TemporaryFolder() {
     std::error_code error;
     const fs::path parent = fs::temp_directory_path(error);
@@ -79,11 +83,11 @@ void write_through_path(const std::string& output,
     write(staged);
     const Stream stream = open(staged, "rb");
     make_binary(stdout);
-    copy(stream.get(), stdout, "standard output");
+    copy(stream.get(), stdout, name_for_reports(output));
 }
 
 // A device or a pipe cannot be replaced by a new file; its bytes go straight in.
-ByteOutput::ByteOutput(const std::string& name) : name_(name) {
+ByteOutput::ByteOutput(const std::string& name) : name_(name_for_reports(name)) {
     if (name == kStandardStream) {
         make_binary(stdout);
         stream_ = stdout;

@@ -13,6 +13,9 @@
 
 constexpr const char* kStandardStream = "-";
 
+// What a message calls an output.
+std::string name_for_reports(const std::string& output);
+
 // A folder that lives as long as the object and is this user's alone.
 class TemporaryFolder {
   public:
