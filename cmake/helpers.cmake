@@ -19,6 +19,13 @@ function(zqvissvc_host_program target)
   target_include_directories(${target} PRIVATE ${PROJECT_BINARY_DIR}/generated)
 endfunction()
 
+# zqvissvc_string_resources(<source>...): resource sources of this folder's targets include the list
+# of strings; the resource compiler does not report that.
+function(zqvissvc_string_resources)
+  set_property(SOURCE ${ARGN} APPEND PROPERTY OBJECT_DEPENDS
+               ${PROJECT_SOURCE_DIR}/src/host/string_table.def)
+endfunction()
+
 # zqvissvc_static_program(<target> <source>...): the same with the whole library inside, for
 # programs that look behind the exported functions.
 function(zqvissvc_static_program target)
@@ -26,6 +33,7 @@ function(zqvissvc_static_program target)
   target_link_libraries(${target} PRIVATE zqvissvc_core zqvissvc_exports)
   if(WIN32)
     target_sources(${target} PRIVATE ${ZQVISSVC_RESOURCES})
+    zqvissvc_string_resources(${ZQVISSVC_RESOURCES})
     target_include_directories(${target} PRIVATE ${PROJECT_SOURCE_DIR}/src)
   endif()
 endfunction()
