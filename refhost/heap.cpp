@@ -169,8 +169,8 @@ std::optional<std::string> Heap::read_string(ZqStringHandle string, const char* 
 
 int32_t Heap::write_string(ZqStringHandle* string, std::string_view text, const char* service) {
     if (string == nullptr) return kBadArgument;
-    const int32_t status =
-        reserve(reinterpret_cast<ZqHandle*>(string), kCountBytes + std::ssize(text), service);
+    const auto size = static_cast<int64_t>(kCountBytes + text.size());
+    const int32_t status = reserve(reinterpret_cast<ZqHandle*>(string), size, service);
     if (status != kOk) return status;
     (**string)->length = static_cast<int32_t>(text.size());
     std::copy(text.begin(), text.end(), (**string)->bytes);
