@@ -1,0 +1,13 @@
+/* All public headers. */
+#ifndef ZQVISSVC_ZQVISSVC_H
+#define ZQVISSVC_ZQVISSVC_H
+
+#include "errors.h"
+#include "files.h"
+#include "host.h"
+#include "image.h"
+#include "slots.h"
+#include "types.h"
+#include "values.h"
+
+#endif
