@@ -78,6 +78,7 @@ TEST(PlatformThread, NotifyAllWakesEveryWaiter) {
     int waiting = 0;
     bool open = false;
     std::vector<std::jthread> threads;
+    threads.reserve(4);
     for (int i = 0; i < 4; ++i) {
         threads.emplace_back([&] {
             std::unique_lock lock(mutex);
