@@ -71,7 +71,7 @@ ZqError ZQ_CALL DF_ImageDTDuplicate(const ZqImageValue* value, ZqImageValue* out
 }
 
 ZqError ZQ_CALL DF_DFDTToImage(ZqImageValue* value, const ZqImageValue* cluster) {
-    return host::run_core([&] {
+    return host::run_host([&] {
         if (value == nullptr) {
             throw kNullPointer;
         }
@@ -87,7 +87,7 @@ ZqError ZQ_CALL DF_DFDTToImage(ZqImageValue* value, const ZqImageValue* cluster)
 }
 
 ZqError ZQ_CALL DF_ImageToDFDT(const ZqImageValue* cluster, ZqImageValue* value) {
-    return host::run_core([&] {
+    return host::run_host([&] {
         if (value == nullptr) {
             throw kNullPointer;
         }
@@ -111,11 +111,11 @@ ZqError ZQ_CALL DF_ImageToDFDT(const ZqImageValue* cluster, ZqImageValue* value)
 }
 
 ZqError ZQ_CALL SetImageCookies(ZqImageHandle image, uint32_t cookie) {
-    return host::run_core([&] { host::set_cookie(image, cookie); });
+    return host::run_host([&] { host::set_cookie(image, cookie); });
 }
 
 ZqError ZQ_CALL ZqLookUpImage(const ZqImageValue* value, ZqImageHandle* image) {
-    return host::run_core([&] {
+    return host::run_host([&] {
         if (image == nullptr) {
             throw kNullPointer;
         }

@@ -36,6 +36,11 @@ std::int32_t run_core(Body body) noexcept {
     }
 }
 
+std::int32_t run_host(Body body) noexcept {
+    const std::int32_t unusable = check_thread();
+    return unusable != kSuccess ? unusable : run_core(body);
+}
+
 std::int32_t run_entry(ZqErrorCluster* error, FunctionId function, Body body) noexcept {
     if (holds_error(error)) return error->code;
     return run_and_report(error, function, body);

@@ -42,6 +42,10 @@ class Body {
 // GRLIBError_enum is its code, anything else thrown is kNotEnoughMemory.
 std::int32_t run_core(Body body) noexcept;
 
+// The same for host-facing entry points: in a thread whose record is inactive nothing happens and
+// kSystemError is returned.
+std::int32_t run_host(Body body) noexcept;
+
 // For entry points with an error cluster (a null one is tolerated). An error that is already there
 // is returned untouched and the body does not run; otherwise the result is reported into the
 // cluster under the function's name. In a thread whose record is inactive nothing happens and

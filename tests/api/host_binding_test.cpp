@@ -3,6 +3,7 @@
 #include <zqvissvc/errors.h>
 #include <zqvissvc/host.h>
 #include <zqvissvc/slots.h>
+#include <zqvissvc/values.h>
 
 #include <climits>
 #include <cstring>
@@ -76,6 +77,12 @@ TEST(HostThreadRecordTest, InactiveThreadDoesNothing) {
     EXPECT_EQ(DF_ProcessError(-1, &error, 313), ZQ_ERR_SYSTEM);
     EXPECT_EQ(DF_ProcessErrorWithVIName(-1, &error, "x"), ZQ_ERR_SYSTEM);
     EXPECT_EQ(DF_CreateErrorCluster(-1, "x", &error), ZQ_ERR_SYSTEM);
+    ZqImageValue value{};
+    ZqImageHandle image = nullptr;
+    EXPECT_EQ(ZqLookUpImage(&value, &image), ZQ_ERR_SYSTEM);
+    EXPECT_EQ(DF_DFDTToImage(&value, &value), ZQ_ERR_SYSTEM);
+    EXPECT_EQ(DF_ImageToDFDT(&value, &value), ZQ_ERR_SYSTEM);
+    EXPECT_EQ(SetImageCookies(nullptr, 1), ZQ_ERR_SYSTEM);
     EXPECT_EQ(SetCleanupProc([](void*) {}, nullptr), 0);
     EXPECT_EQ(EnterModalDialog(), 0);
     EXPECT_EQ(LeaveModalDialog(), 0);
