@@ -29,6 +29,15 @@ T& required(T* target) {
     return *target;
 }
 
+// Checks the target before there is an image to lose.
+template <class Create>
+ZqError create_into(ZqImageHandle* image, Create create) {
+    return host::run_core([&] {
+        ZqImageHandle& target = required(image);
+        target = create();
+    });
+}
+
 std::span<const ImageHandle> request(const ZqImageHandle* images, int32_t count) {
     if (count < 0) {
         throw kInvalidParameter;
@@ -79,42 +88,38 @@ class ForeignExtraInfo final : public ImageExtraInfo {
 
 ZqError ZQ_CALL NewImage(int32_t type, int32_t width, int32_t height, int32_t border,
                          ZqImageHandle* image) {
-    return host::run_core([&] { required(image) = new_image({type, width, height, border}); });
+    return create_into(image, [&] { return new_image({type, width, height, border}); });
 }
 
 ZqError ZQ_CALL NewGreedyImage(int32_t type, int32_t width, int32_t height, int32_t border,
                                ZqImageHandle* image) {
-    return host::run_core([&] {
-        required(image) = new_image({type, width, height, border, true});
-    });
+    return create_into(image, [&] { return new_image({type, width, height, border, true}); });
 }
 
 ZqError ZQ_CALL NewNamedImage(int32_t type, int32_t width, int32_t height, int32_t border,
                               const char* name, uint8_t greedy, ZqImageHandle* image) {
-    return host::run_core([&] {
-        required(image) = new_named_image({type, width, height, border, greedy != 0}, text_of(name),
-                                          Variant::kRegistered)
-                              .image;
+    return create_into(image, [&] {
+        const ImageShape shape = {type, width, height, border, greedy != 0};
+        return new_named_image(shape, text_of(name), Variant::kRegistered).image;
     });
 }
 
 ZqError ZQ_CALL NewPrivateNamedImage(int32_t type, int32_t width, int32_t height, int32_t border,
                                      const char* name, uint8_t greedy, ZqImageHandle* image) {
-    return host::run_core([&] {
-        required(image) = new_named_image({type, width, height, border, greedy != 0}, text_of(name),
-                                          Variant::kPrivate)
-                              .image;
+    return create_into(image, [&] {
+        const ImageShape shape = {type, width, height, border, greedy != 0};
+        return new_named_image(shape, text_of(name), Variant::kPrivate).image;
     });
 }
 
 ZqError ZQ_CALL NewExternalImage(int32_t type, int32_t width, int32_t height, int32_t border,
                                  void* buffer, int32_t rowPixels, const char* name,
                                  ZqImageHandle* image) {
-    return host::run_core([&] {
-        required(image) =
-            new_external_image({type, width, height, border}, static_cast<std::uint8_t*>(buffer),
-                               rowPixels, text_of(name))
-                .image;
+    return create_into(image, [&] {
+        const ImageShape shape = {type, width, height, border};
+        return new_external_image(shape, static_cast<std::uint8_t*>(buffer), rowPixels,
+                                  text_of(name))
+            .image;
     });
 }
 
