@@ -49,6 +49,11 @@ void* allocate_or_throw(std::size_t bytes) {
     return block;
 }
 
+// Never inlined: the compiler would take it for a mistake that what `new` gave goes to free().
+[[gnu::noinline]] void release(void* block) noexcept {
+    std::free(block);
+}
+
 }  // namespace
 
 // For the whole program; unarmed they are the ordinary ones.
@@ -65,22 +70,22 @@ void* operator new[](std::size_t bytes, const std::nothrow_t& /*tag*/) noexcept 
     return allocate(bytes);
 }
 void operator delete(void* block) noexcept {
-    std::free(block);
+    release(block);
 }
 void operator delete[](void* block) noexcept {
-    std::free(block);
+    release(block);
 }
 void operator delete(void* block, std::size_t /*bytes*/) noexcept {
-    std::free(block);
+    release(block);
 }
 void operator delete[](void* block, std::size_t /*bytes*/) noexcept {
-    std::free(block);
+    release(block);
 }
 void operator delete(void* block, const std::nothrow_t& /*tag*/) noexcept {
-    std::free(block);
+    release(block);
 }
 void operator delete[](void* block, const std::nothrow_t& /*tag*/) noexcept {
-    std::free(block);
+    release(block);
 }
 
 namespace zq {
@@ -96,7 +101,7 @@ const memory::HostRoutine kRoutine = {[](std::size_t bytes) -> void* {
                                       },
                                       [](void* block) {
                                           --live_buffers;
-                                          std::free(block);
+                                          release(block);
                                       }};
 
 class AllocationFailureTest : public testing::Test {
