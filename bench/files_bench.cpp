@@ -172,7 +172,7 @@ void FileAipdWrite(benchmark::State& state) {
     const Image image(type, kWidth, kHeight);
     const std::string ours = temporary("zqbench-ours.aipd"), plain = temporary("zqbench.bytes");
     write_file(ours, image, "AIPD");
-    const size_t size = std::filesystem::file_size(ours);
+    const auto size = static_cast<size_t>(std::filesystem::file_size(ours));
     const std::unique_ptr<uint8_t[]> bytes(new uint8_t[size]());
     zqbench::run_paired(
         state, [&] { write_file(ours, image, "AIPD"); },
@@ -196,7 +196,7 @@ void FileAipdRead(benchmark::State& state) {
     const Image image(type, kWidth, kHeight);
     const std::string path = temporary("zqbench.aipd");
     write_file(path, image, "AIPD");
-    const size_t size = std::filesystem::file_size(path);
+    const auto size = static_cast<size_t>(std::filesystem::file_size(path));
     const std::unique_ptr<uint8_t[]> bytes(new uint8_t[size]());
     zqbench::run_paired(
         state, [&] { read_file(path, image); },
