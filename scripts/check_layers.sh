@@ -26,6 +26,6 @@ report "operating-system switch outside platform/" \
     "$(grep -rnE '\b(_WIN32|_WIN64|__linux__|__unix__|__MINGW32__)\b' src include tools |
         grep -vE '^(src/platform/|include/zqvissvc/types\.h:)' || true)"
 report "path of one machine" \
-    "$(git grep --untracked -nIE '(^|[^A-Za-z0-9_.}/])/(work|root|tmp|home)/[A-Za-z]' -- \
+    "$(git grep --untracked -nIE '(^|[^A-Za-z0-9_.}/"]|(^|[^A-Za-z0-9_}])")/(work|root|tmp|home)/[A-Za-z]' -- \
         . ':!scripts/check_layers.sh' || true)"
 exit $status
