@@ -67,10 +67,9 @@ ZQ_API ZqError ZQ_CALL Gen_MarkExternalBuffer(const ZqImageValue* image, uint8_t
 ZQ_API ZqError ZQ_CALL Gen_GetExternalCount(const ZqImageValue* image, int32_t* count);
 
 /* The pool for time-bounded work: sizeKB above 0 reserves it (-1074396089 when there is one), 0 or
- * less releases it
- * (-1074396092 while reservations are live, -1074396090 while it is enabled), also with an error
- * pending. It is released when the host tears the caller down. While enabled, every pixel buffer is
- * carved from it. Resetting makes it forget its reservations (-1074396090 while enabled), also with
+ * less releases it (-1074396092 while reservations are live, -1074396090 while it is enabled), also
+ * with an error pending. It is released when the host tears the caller down. While enabled, every
+ * pixel buffer is carved from it. Resetting makes it forget its reservations (-1074396090 while enabled), also with
  * an error pending: images that still lie in it then share memory with later ones. Enabling (enable
  * = 1; anything else disables) needs a pool: -1074396091. */
 ZQ_API ZqError ZQ_CALL DF_SetMemoryPoolSize(int32_t sizeKB, ZqErrorCluster* error);
@@ -89,6 +88,7 @@ ZQ_API ZqError ZQ_CALL DF_GetImageInfo2(const ZqImageValue* image, int32_t* type
                                         int32_t* height, int32_t* unit, float* xStep, float* yStep,
                                         ZqStringHandle* name, ZqErrorCluster* error);
 
+/* Width and height in pixels, without the border. */
 ZQ_API ZqError ZQ_CALL DF_GetImageSize(const ZqImageValue* image, int32_t* width, int32_t* height,
                                        ZqErrorCluster* error);
 
