@@ -7,6 +7,7 @@
 #include "base/checked.h"
 #include "files/png_chunks.h"
 #include "files/write_job.h"
+#include "kernels/colour_rows.h"
 
 namespace zq {
 
@@ -73,6 +74,7 @@ void PngReader::read_info() {
     depth_ = png_get_bit_depth(png, info);
     colour_type_ = png_get_color_type(png, info);
     channels_ = png_get_channels(png, info);
+    interlaced_ = png_get_interlace_type(png, info) != PNG_INTERLACE_NONE;
     sample_offset_ = find_sample_offset(png, info);
     check_plausible();
 }
@@ -131,7 +133,15 @@ std::vector<std::uint32_t> PngReader::colour_table() const {
     return table;
 }
 
-// Called inside a step.
+// The one layout whose rows are expanded here, which is much faster than libpng's way. Rows that
+// are put together from several passes must have their final form all the time.
+bool PngReader::is_plain_rgb() const {
+    return colour_type_ == PNG_COLOR_TYPE_RGB && depth_ == 8 && !interlaced_ &&
+           png_get_valid(session_.png(), session_.info(), PNG_INFO_tRNS) == 0;
+}
+
+// The functions up to read_row are called inside a step.
+
 void PngReader::set_transformations() {
     const png_structp png = session_.png();
     if (depth_ == 16) png_set_swap(png);
@@ -143,12 +153,18 @@ void PngReader::set_transformations() {
         case PixelType::kI16:
             break;
         default:
+            if (is_plain_rgb()) break;
             if ((colour_type_ & PNG_COLOR_MASK_COLOR) == 0) png_set_gray_to_rgb(png);
             if (png_get_valid(png, session_.info(), PNG_INFO_tRNS) != 0) png_set_tRNS_to_alpha(png);
             png_set_filler(png, 0, PNG_FILLER_AFTER);
             png_set_bgr(png);
             break;
     }
+}
+
+void PngReader::read_row(std::uint8_t* row) {
+    png_read_row(session_.png(), packed_.empty() ? row : packed_.data(), nullptr);
+    if (!packed_.empty()) rgb_to_bgra(packed_.data(), row, width_);
 }
 
 void PngReader::read_pixels(Image& image) {
@@ -162,12 +178,17 @@ void PngReader::read_pixels(Image& image) {
     });
     const auto row_bytes =
         static_cast<std::size_t>(width()) * static_cast<std::size_t>(bytes_per_pixel(image.type()));
-    if (png_get_rowbytes(png, session_.info()) != row_bytes) throw kUnableToReadData;
+    const std::size_t delivered = png_get_rowbytes(png, session_.info());
+    if (is_plain_rgb()) {
+        packed_.resize(delivered);
+    } else if (delivered != row_bytes) {
+        throw kUnableToReadData;
+    }
     bool above_signed = false;
     session_.run(kUnableToReadData, [&] {
         for (int pass = 0; pass < passes; ++pass) {
             for (std::int32_t y = 0; y < height(); ++y) {
-                png_read_row(png, image.row(y), nullptr);
+                read_row(image.row(y));
                 if (is_16_bit_grey && pass + 1 == passes && !above_signed) {
                     above_signed = any_above_signed(image.row(y), row_bytes);
                 }

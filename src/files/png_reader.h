@@ -37,6 +37,8 @@ class PngReader {
 
   private:
     void check_plausible() const;
+    bool is_plain_rgb() const;
+    void read_row(std::uint8_t* row);
     void set_transformations();
     void apply_sample_offset(Image& image, bool samples_above_signed) const;
 
@@ -47,6 +49,8 @@ class PngReader {
     int depth_ = 0;  // bits per sample
     int colour_type_ = 0;
     int channels_ = 0;
+    bool interlaced_ = false;
+    std::vector<std::uint8_t> packed_;  // a row as the file holds it; empty when not needed
     std::optional<std::int16_t> sample_offset_;
 };
 

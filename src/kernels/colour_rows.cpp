@@ -1,0 +1,45 @@
+// Colour rows with the widest vectors that the processor has.
+#include "kernels/colour_rows.h"
+
+#undef HWY_TARGET_INCLUDE
+#define HWY_TARGET_INCLUDE "kernels/colour_rows.cpp"
+#include <hwy/foreach_target.h>
+// Must come after foreach_target.h.
+#include <hwy/highway.h>
+
+#include "kernels/colour_rows_scalar.h"
+
+HWY_BEFORE_NAMESPACE();
+namespace zq::HWY_NAMESPACE {
+
+namespace hn = hwy::HWY_NAMESPACE;
+
+void rgb_to_bgra(const std::uint8_t* HWY_RESTRICT source, std::uint8_t* HWY_RESTRICT destination,
+                 std::size_t pixels) {
+    std::size_t done = 0;
+#if HWY_TARGET != HWY_SCALAR
+    const hn::ScalableTag<std::uint8_t> tag;
+    const auto alpha = hn::Zero(tag);
+    for (; done + hn::Lanes(tag) <= pixels; done += hn::Lanes(tag)) {
+        auto red = alpha, green = alpha, blue = alpha;
+        hn::LoadInterleaved3(tag, source + 3 * done, red, green, blue);
+        hn::StoreInterleaved4(blue, green, red, alpha, tag, destination + 4 * done);
+    }
+#endif
+    scalar::rgb_to_bgra(source + 3 * done, destination + 4 * done, pixels - done);
+}
+
+}  // namespace zq::HWY_NAMESPACE
+HWY_AFTER_NAMESPACE();
+
+#if HWY_ONCE
+namespace zq {
+
+HWY_EXPORT(rgb_to_bgra);
+
+void rgb_to_bgra(const std::uint8_t* source, std::uint8_t* destination, std::size_t pixels) {
+    HWY_DYNAMIC_DISPATCH(rgb_to_bgra)(source, destination, pixels);
+}
+
+}  // namespace zq
+#endif
