@@ -16,6 +16,7 @@ kLibraries=(zlib1g-dev libpng-dev libhwy-dev libgtest-dev libgmock-dev libbenchm
     libcli11-dev libfmt-dev nlohmann-json3-dev)
 kTools=(git cmake ninja-build ccache g++ binutils)
 kCross=(nasm dpkg-dev g++-mingw-w64-x86-64-posix g++-mingw-w64-i686-posix)
+kOtherCross=(gcc-mingw-w64-x86-64-win32 gcc-mingw-w64-i686-win32 clang)   # tests/contract
 
 installed() { [[ $(dpkg-query -W -f='${db:Status-Status}' "$1" 2>/dev/null) == installed* ]]; }
 
@@ -79,6 +80,24 @@ wine_setup() {
     touch "$WINEPREFIX/.complete"
 }
 
+# Exports how 32-bit Windows programs are run; makes nothing yet.
+win32_runner() {
+    local key
+    key=$(cat scripts/run-win32.sh scripts/win32/* | sha256sum | cut -c1-12)
+    export ZQVISSVC_RUN_WIN32="$PWD/scripts/run-win32.sh;$cache/win32-$key"
+}
+
+# Makes ready what runs them. Status 77 where this machine cannot, with the reason in the last line
+# of $cache/win32.log.
+win32_setup() {
+    win32_runner
+    [[ -e ${ZQVISSVC_RUN_WIN32#*;}/complete ]] && return
+    (need xvfb x11-xkb-utils gcc) || true
+    say "preparing the 32-bit Wine, once"
+    scripts/run-win32.sh --prepare "${ZQVISSVC_RUN_WIN32#*;}" 2>&1 | tee "$cache/win32.log"
+    return "${PIPESTATUS[0]}"
+}
+
 # ---- Builds
 
 # Unchanged sources are not compiled again, not even in a fresh clone elsewhere.
@@ -97,13 +116,14 @@ prepare_preset() {
             wine_setup
             ZQVISSVC_DEPS_WIN64=$(mingw_prefix x86_64)
             export ZQVISSVC_DEPS_WIN64
-            need "${kTools[@]}" "${kCross[@]}"
+            need "${kTools[@]}" "${kCross[@]}" "${kOtherCross[@]}"
             ;;
         win32)
             mingw_deps i686
             ZQVISSVC_DEPS_WIN32=$(mingw_prefix i686)
             export ZQVISSVC_DEPS_WIN32
-            need "${kTools[@]}" "${kCross[@]}"
+            win32_runner
+            need "${kTools[@]}" "${kCross[@]}" "${kOtherCross[@]}"
             ;;
         *) die "unknown preset '$1' (native, asan, tsan, win64, win32)" ;;
     esac
