@@ -13,7 +13,7 @@ check() {
 }
 
 format() { sources | xargs -r clang-format --dry-run -Werror; }
-scripts_clean() { shellcheck -x -S warning dev .ci/run scripts/*.sh cmake/*.sh; }
+scripts_clean() { shellcheck -x -S warning dev .ci/run scripts/*.sh scripts/win32/*.sh cmake/*.sh; }
 # A source that this target does not compile has no entry in the compile database.
 tidy() {
     sources | grep -E '\.(cpp|cc)$' | while read -r file; do
