@@ -63,7 +63,7 @@ void lock_images(std::span<const ImageHandle> images) {
 void unlock_images(std::span<const ImageHandle> images) noexcept {
     // Without a list of its own: unlocking works without memory.
     for (auto each = images.begin(); each != images.end(); ++each) {
-        const Pin pin = Registry::instance().pin(Image::object_address(*each));
+        const Pin pin = Registry::instance().pin_to_unlock(Image::object_address(*each));
         if (pin && pin.tag == kImageTag && std::find(images.begin(), each, *each) == each) {
             pin.gate->unlock();
         }

@@ -49,7 +49,8 @@ class LockedImage {
 };
 
 // The unpaired forms for sibling libraries. lock_images throws as ImageLock does. unlock_images
-// undoes one lock request for the same images; images that are gone are skipped.
+// undoes one lock request for the same images, also for those that another thread waits to dispose;
+// images that are gone are skipped.
 void lock_images(std::span<const ImageHandle> images);
 void unlock_images(std::span<const ImageHandle> images) noexcept;
 

@@ -195,41 +195,55 @@ Pin Registry::pin(std::uintptr_t address) {
     return found == positions_.end() ? Pin{} : examine(found->second, kAnyTag);
 }
 
-bool Registry::dispose(std::uintptr_t address) {
-    Ordinal ordinal = 0;
-    std::shared_ptr<ObjectGate> gate;
-    {
-        const std::lock_guard removal(removal_);
-        const std::lock_guard lock(index_);
-        const auto found = positions_.find(address);
-        if (found == positions_.end()) {
-            return false;
-        }
-        ordinal = found->second;
-        positions_.erase(found);
-        Slot& slot = slot_at(ordinal);
-        forget_name(slot.name, ordinal);
-        gate = slot.object->gate();
+Pin Registry::pin_to_unlock(std::uintptr_t address) {
+    const std::lock_guard lock(index_);
+    const auto found = positions_.find(address);
+    if (found == positions_.end()) {
+        return {};
     }
-    destroy_slot(ordinal, gate);
-    return true;
+    const Slot& slot = slot_at(found->second);
+    return {slot.object, slot.tag, slot.object->gate()};
 }
 
-// Nobody finds the slot any more; those who found it before wait at the gate or hold it.
-void Registry::destroy_slot(Ordinal ordinal, const std::shared_ptr<ObjectGate>& gate) {
-    gate->close();
+Pin Registry::begin_disposal(std::uintptr_t address, Ordinal& ordinal) {
+    const std::lock_guard removal(removal_);
+    const std::lock_guard lock(index_);
+    const auto found = positions_.find(address);
+    if (found == positions_.end()) {
+        return {};
+    }
+    ordinal = found->second;
+    Pin pin = examine(ordinal, kAnyTag);
+    if (pin) {
+        Slot& slot = slot_at(ordinal);
+        SlotHold(slot).set_state(kDestroying);
+        forget_name(slot.name, ordinal);
+    }
+    return pin;
+}
+
+bool Registry::dispose(std::uintptr_t address) {
+    Ordinal ordinal = 0;
+    const Pin pin = begin_disposal(address, ordinal);
+    if (!pin) {
+        return false;
+    }
+    // Those who found the object before wait at the gate, or hold it and still find it to unlock.
+    pin.gate->close();
     Slot* slot = nullptr;
     {
         const std::lock_guard lock(index_);
+        positions_.erase(address);
         slot = &slot_at(ordinal);
     }
-    { SlotHold(*slot).set_state(kDestroying); }
-    slot->handler->release_resources(*slot->object);
-    slot->handler->destroy(std::exchange(slot->object, nullptr));
+    slot->handler->release_resources(*pin.object);
+    slot->object = nullptr;
+    slot->handler->destroy(pin.object);
     slot->name.clear();
     const std::lock_guard lock(index_);
     SlotHold(*slot).set_state(kFree);
     free_slot(ordinal);
+    return true;
 }
 
 bool Registry::next_of_kind(std::int32_t tag, Ordinal& from, std::uintptr_t& address) {

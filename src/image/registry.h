@@ -68,6 +68,8 @@ class Registry {
     Pin find(std::string_view name, std::int32_t tag);
     // The live object at an address; the address is compared, never followed.
     Pin pin(std::uintptr_t address);
+    // The same, also while the object's disposal waits for whoever holds its lock: for unlocking.
+    Pin pin_to_unlock(std::uintptr_t address);
 
     // Waits until nobody else holds the object's lock, then destroys it. False when nothing is
     // registered there (any more), which is no error.
@@ -100,7 +102,9 @@ class Registry {
     Pin find_indexed(std::string_view name, std::int32_t tag);
     void index_name(std::string_view name, Ordinal ordinal);
     void forget_name(std::string_view name, Ordinal ordinal);
-    void destroy_slot(Ordinal ordinal, const std::shared_ptr<ObjectGate>& gate);
+    // Marks the object as being destroyed, so that nobody finds it any more. Empty for an object
+    // that is not there, or already marked.
+    Pin begin_disposal(std::uintptr_t address, Ordinal& ordinal);
     bool next_of_kind(std::int32_t tag, Ordinal& from, std::uintptr_t& address);
 
     platform::Mutex removal_;  // one removal at a time looks for its slot

@@ -114,22 +114,25 @@ TEST(RegistryLockTest, WaitersLearnThatTheImageIsGone) {
     }
 }
 
-// The holder goes on with pixels and record until it lets go; a second disposal does not wait.
+// The holder goes on with pixels and record until it lets go, by the handle that nobody finds any
+// more; a second disposal does not wait.
 TEST(RegistryLockTest, DisposalWaitsForTheHolder) {
     for (int round = 0; round < 50; ++round) {
         const ImageHandle image = new_image(kSmall);
         std::atomic<bool> locked = false;
         std::atomic<bool> done = false;
         std::thread holder([&] {
-            const LockedImage held(image);
+            lock_images({&image, 1});
             locked = true;
             while (Registry::instance().pin(Image::object_address(image))) {
                 std::this_thread::yield();
             }
             dispose_image(image);
-            held->resize(40, 40, std::nullopt, ResizeMode::kPlain);
-            std::memset(held->row(0), 1, 40);
+            Image& held = *Image::from_handle(image);
+            held.resize(40, 40, std::nullopt, ResizeMode::kPlain);
+            std::memset(held.row(0), 1, 40);
             done = true;
+            unlock_images({&image, 1});
         });
         while (!locked) std::this_thread::yield();
         dispose_image(image);
