@@ -38,3 +38,9 @@ if(ZQVISSVC_SANITIZE)
   add_compile_options(-fsanitize=${ZQVISSVC_SANITIZE} -fno-sanitize-recover=all)
   add_link_options(-fsanitize=${ZQVISSVC_SANITIZE})
 endif()
+# What tests are run with. A refused allocation must come back as a null pointer, as it does
+# without a sanitizer.
+set(ZQVISSVC_SANITIZER_OPTIONS
+  ASAN_OPTIONS=allocator_may_return_null=1
+  UBSAN_OPTIONS=print_stacktrace=1
+  TSAN_OPTIONS=second_deadlock_stack=1,allocator_may_return_null=1)

@@ -7,6 +7,7 @@ seconds=${1:-60}
 [[ $seconds =~ ^[1-9][0-9]*$ ]] || die "usage: ./dev fuzz [SECONDS]"
 
 build_preset fuzz
+export ASAN_OPTIONS=allocator_may_return_null=1 UBSAN_OPTIONS=print_stacktrace=1
 findings=build/fuzz/findings
 mkdir -p "$findings"
 failed=()
