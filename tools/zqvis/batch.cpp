@@ -6,6 +6,7 @@
 
 #include <cstdio>
 #include <new>
+#include <system_error>
 
 #include "console.h"
 #include "failure.h"
@@ -66,6 +67,18 @@ int run_batch(const std::vector<std::string>& files, bool quiet,
             fail(files[i], ZQ_ERR_NOT_ENOUGH_MEMORY);
         }
     }
-    if (std::fflush(stdout) != 0) fail("standard output", ZQ_ERR_UNABLE_TO_WRITE_DATA);
     return status;
+}
+
+int with_output_checked(const std::function<int()>& work) {
+    ZqError code = ZQ_ERR_NONE;
+    try {
+        const int status = work();
+        if (status != kDone || std::fflush(stdout) == 0) return status;
+        code = ZQ_ERR_UNABLE_TO_WRITE_DATA;
+    } catch (const std::system_error& error) {  // of a print that could not be written
+        code = Failure(error.code()).code();
+    }
+    report("standard output", code);
+    return kFailed;
 }

@@ -17,4 +17,8 @@ constexpr int kWrongUsage = 2;
 int run_batch(const std::vector<std::string>& files, bool quiet,
               const std::function<std::string(const std::string&)>& work);
 
+// Runs `work`, which returns an exit status and prints; prints that cannot be written are a
+// failure.
+int with_output_checked(const std::function<int()>& work);
+
 #endif

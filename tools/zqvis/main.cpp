@@ -32,7 +32,7 @@ int run(int argc, char** argv) {
 }  // namespace
 
 int main(int argc, char** argv) {
-    const int status = run(argc, argv);
+    const int status = with_output_checked([&] { return run(argc, argv); });
     refhost::run_cleanup();
     return status;
 }
