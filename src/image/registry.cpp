@@ -4,7 +4,9 @@
 #include <algorithm>
 #include <array>
 #include <atomic>
+#include <functional>
 #include <mutex>
+#include <string>
 #include <utility>
 
 #include "image/lent_buffers.h"
@@ -20,6 +22,15 @@ constexpr std::uint32_t kHeld = 0;
 constexpr std::uint32_t kFree = 1;
 constexpr std::uint32_t kOccupied = 2;
 constexpr std::uint32_t kDestroying = 4;
+
+std::uint32_t hash_of(std::uintptr_t address) {
+    // Addresses differ in their middle bits; the multiplication spreads them over the upper half.
+    return static_cast<std::uint32_t>((std::uint64_t{address} * 0x9E3779B97F4A7C15U) >> 32);
+}
+
+std::uint32_t hash_of(std::string_view name) {
+    return static_cast<std::uint32_t>(std::hash<std::string_view>()(name));
+}
 
 }  // namespace
 
@@ -85,8 +96,10 @@ Registry::Slot& Registry::slot_at(Ordinal ordinal) {
 
 void Registry::append_block() {
     const auto first = static_cast<Ordinal>(blocks_.size()) * kSlotsPerBlock;
-    // Room for every slot, so that freeing one never needs memory.
+    // Room for every slot, so that only this step needs memory.
     free_.reserve(first + kSlotsPerBlock);
+    positions_.reserve(first + kSlotsPerBlock);
+    names_.reserve(first + kSlotsPerBlock);
     blocks_.push_back(std::make_unique<Block>());
     if (blocks_.size() > 1) {
         blocks_[blocks_.size() - 2]->next = blocks_.back().get();
@@ -110,7 +123,6 @@ void Registry::free_slot(Ordinal ordinal) {
 
 bool Registry::add(std::unique_ptr<Object>& object, ObjectHandler& handler, std::int32_t tag,
                    std::string_view name, bool unique) {
-    const auto address = reinterpret_cast<std::uintptr_t>(object.get());
     std::string name_copy(name);
     const std::lock_guard lock(index_);
     if (unique && find_indexed(name, tag)) {
@@ -119,15 +131,12 @@ bool Registry::add(std::unique_ptr<Object>& object, ObjectHandler& handler, std:
     if (free_.empty()) {
         append_block();
     }
-    const Ordinal ordinal = free_.front();
-    const auto position = positions_.emplace(address, ordinal).first;
-    try {
-        index_name(name, ordinal);
-    } catch (...) {
-        positions_.erase(position);
-        throw;
+    const Ordinal ordinal = take_free_slot();
+    positions_.insert(hash_of(reinterpret_cast<std::uintptr_t>(object.get())), ordinal);
+    if (!name.empty()) {
+        names_.insert(hash_of(name), ordinal);
     }
-    take_free_slot();
+    ++live_;
     Slot& slot = slot_at(ordinal);
     SlotHold hold(slot);
     slot.object = object.release();
@@ -139,28 +148,14 @@ bool Registry::add(std::unique_ptr<Object>& object, ObjectHandler& handler, std:
     return true;
 }
 
-void Registry::index_name(std::string_view name, Ordinal ordinal) {
-    if (name.empty()) {
-        return;
-    }
-    auto found = names_.find(name);
-    if (found == names_.end()) {
-        names_.emplace(std::string(name), std::vector<Ordinal>{ordinal});
-        return;
-    }
-    std::vector<Ordinal>& ordinals = found->second;
-    ordinals.insert(std::upper_bound(ordinals.begin(), ordinals.end(), ordinal), ordinal);
-}
-
-void Registry::forget_name(std::string_view name, Ordinal ordinal) {
-    const auto found = names_.find(name);
-    if (found == names_.end()) {
-        return;
-    }
-    std::erase(found->second, ordinal);
-    if (found->second.empty()) {
-        names_.erase(found);
-    }
+std::optional<Registry::Ordinal> Registry::position_of(std::uintptr_t address) {
+    std::optional<Ordinal> position;
+    positions_.for_each(hash_of(address), [&](Ordinal ordinal) {
+        if (reinterpret_cast<std::uintptr_t>(slot_at(ordinal).object) == address) {
+            position = ordinal;
+        }
+    });
+    return position;
 }
 
 Pin Registry::examine(Ordinal ordinal, std::int32_t tag) {
@@ -173,15 +168,17 @@ Pin Registry::examine(Ordinal ordinal, std::int32_t tag) {
 }
 
 Pin Registry::find_indexed(std::string_view name, std::int32_t tag) {
-    const auto found = names_.find(name);
-    if (found != names_.end()) {
-        for (const Ordinal ordinal : found->second) {
+    Pin first;
+    std::optional<Ordinal> lowest;
+    names_.for_each(hash_of(name), [&](Ordinal ordinal) {
+        if ((!lowest || ordinal < *lowest) && slot_at(ordinal).name == name) {
             if (Pin pin = examine(ordinal, tag)) {
-                return pin;
+                first = std::move(pin);
+                lowest = ordinal;
             }
         }
-    }
-    return {};
+    });
+    return first;
 }
 
 Pin Registry::find(std::string_view name, std::int32_t tag) {
@@ -191,33 +188,35 @@ Pin Registry::find(std::string_view name, std::int32_t tag) {
 
 Pin Registry::pin(std::uintptr_t address) {
     const std::lock_guard lock(index_);
-    const auto found = positions_.find(address);
-    return found == positions_.end() ? Pin{} : examine(found->second, kAnyTag);
+    const auto position = position_of(address);
+    return position ? examine(*position, kAnyTag) : Pin{};
 }
 
 Pin Registry::pin_to_unlock(std::uintptr_t address) {
     const std::lock_guard lock(index_);
-    const auto found = positions_.find(address);
-    if (found == positions_.end()) {
+    const auto position = position_of(address);
+    if (!position) {
         return {};
     }
-    const Slot& slot = slot_at(found->second);
+    const Slot& slot = slot_at(*position);
     return {slot.object, slot.tag, slot.object->gate()};
 }
 
 Pin Registry::begin_disposal(std::uintptr_t address, Ordinal& ordinal) {
     const std::lock_guard removal(removal_);
     const std::lock_guard lock(index_);
-    const auto found = positions_.find(address);
-    if (found == positions_.end()) {
+    const auto position = position_of(address);
+    if (!position) {
         return {};
     }
-    ordinal = found->second;
+    ordinal = *position;
     Pin pin = examine(ordinal, kAnyTag);
     if (pin) {
         Slot& slot = slot_at(ordinal);
         SlotHold(slot).set_state(kDestroying);
-        forget_name(slot.name, ordinal);
+        if (!slot.name.empty()) {
+            names_.erase(ordinal);
+        }
     }
     return pin;
 }
@@ -233,7 +232,8 @@ bool Registry::dispose(std::uintptr_t address) {
     Slot* slot = nullptr;
     {
         const std::lock_guard lock(index_);
-        positions_.erase(address);
+        positions_.erase(ordinal);
+        --live_;
         slot = &slot_at(ordinal);
     }
     slot->handler->release_resources(*pin.object);
@@ -269,7 +269,7 @@ void Registry::dispose_all(std::int32_t tag) {
 
 std::size_t Registry::live_count() {
     const std::lock_guard lock(index_);
-    return positions_.size();
+    return live_;
 }
 
 }  // namespace zq

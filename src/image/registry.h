@@ -3,22 +3,21 @@
 //
 // Objects sit in slots, 32 to a block, blocks chained. A slot's state word is changed by atomic
 // exchange only: 1 free, 2 occupied, 4 being destroyed, 0 held by a thread that examines the slot.
-// Beside the chain an index keeps, under its own mutex, where each object sits, which slots hold
-// each name (in chain order) and which slots are free (lowest first). So nothing gets dearer with
+// Beside the chain indexes keep, under their own mutex, where each object sits, which slots hold
+// each name and which slots are free (lowest first). So nothing gets dearer with
 // the number of live objects, and what is found is what a walk of the chain from its start finds
 // first.
 #pragma once
 
 #include <cstddef>
 #include <cstdint>
-#include <functional>
 #include <memory>
-#include <string>
+#include <optional>
 #include <string_view>
-#include <unordered_map>
 #include <vector>
 
 #include "image/object.h"
+#include "image/slot_index.h"
 #include "platform/mutex.h"
 
 namespace zq {
@@ -83,16 +82,7 @@ class Registry {
     struct Slot;
     struct Block;
     class SlotHold;
-    using Ordinal = std::uint32_t;  // position of a slot in the chain
-
-    struct TextHash {
-        using is_transparent = void;
-        std::size_t operator()(std::string_view text) const {
-            return std::hash<std::string_view>()(text);
-        }
-    };
-    using NameIndex =
-        std::unordered_map<std::string, std::vector<Ordinal>, TextHash, std::equal_to<>>;
+    using Ordinal = SlotIndex::Slot;  // position of a slot in the chain
 
     Slot& slot_at(Ordinal ordinal);
     void append_block();
@@ -100,8 +90,7 @@ class Registry {
     void free_slot(Ordinal ordinal);
     Pin examine(Ordinal ordinal, std::int32_t tag);
     Pin find_indexed(std::string_view name, std::int32_t tag);
-    void index_name(std::string_view name, Ordinal ordinal);
-    void forget_name(std::string_view name, Ordinal ordinal);
+    std::optional<Ordinal> position_of(std::uintptr_t address);
     // Marks the object as being destroyed, so that nobody finds it any more. Empty for an object
     // that is not there, or already marked.
     Pin begin_disposal(std::uintptr_t address, Ordinal& ordinal);
@@ -112,8 +101,9 @@ class Registry {
         index_;  // guards everything below; never held while an object's lock is waited for
     std::vector<std::unique_ptr<Block>> blocks_;
     std::vector<Ordinal> free_;  // a heap, lowest ordinal on top
-    std::unordered_map<std::uintptr_t, Ordinal> positions_;
-    NameIndex names_;
+    SlotIndex positions_;        // by the object's address
+    SlotIndex names_;            // by name; unnamed objects are not in it
+    std::size_t live_ = 0;
 };
 
 }  // namespace zq
