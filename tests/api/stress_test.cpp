@@ -19,7 +19,7 @@ constexpr int kThreads = 8;
 #if defined(__SANITIZE_THREAD__)
 constexpr int kRounds = 2000;  // each costs ten times as much there
 #else
-constexpr int kRounds = 50000;
+constexpr int kRounds = 30000;
 #endif
 constexpr ZqError kNotAnImage = -1074396120;
 constexpr ZqError kLent = -1074396065;
