@@ -35,7 +35,8 @@ class ImageFileHandler {
     ImageFileHandler& operator=(const ImageFileHandler&) = delete;
 
     // Reads the file, positioned at its start, into the image. A file of another type is success
-    // with `recognised` false. On failure the target is what it was.
+    // with `recognised` false. On failure the target is what it was, unless its pixels were read in
+    // place (below) and the system failed in the middle of them.
     GRLIBError_enum read(InputFile& file, Image& target, const Accept& accept,
                          bool& recognised) noexcept;
 
