@@ -23,7 +23,7 @@ endfunction()
 # of strings; the resource compiler does not report that.
 function(zqvissvc_string_resources)
   set_property(SOURCE ${ARGN} APPEND PROPERTY OBJECT_DEPENDS
-               ${PROJECT_SOURCE_DIR}/src/host/string_table.def)
+               ${PROJECT_SOURCE_DIR}/src/base/string_table.def)
 endfunction()
 
 # zqvissvc_static_program(<target> <source>...): the same with the whole library inside, for

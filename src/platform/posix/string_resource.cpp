@@ -14,7 +14,7 @@ struct TableString {
 
 constexpr TableString kTable[] = {
 #define ZQ_STRING(id, text) {id, text},
-#include "host/string_table.def"
+#include "base/string_table.def"
 #undef ZQ_STRING
 };
 
