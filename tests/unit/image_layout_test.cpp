@@ -77,6 +77,28 @@ TEST(ImageLayoutTest, EveryRowIsAlignedAndInsideTheBuffer) {
     }
 }
 
+// Padding up to an aligned address comes first; what of the left border it does not hold adds whole
+// 32 bytes.
+TEST(ImageLayoutTest, TheFirstRowIsMovedBehindItsBorderInSteps) {
+    struct Case {
+        PixelType type;
+        std::int32_t border, misalignment;
+        std::ptrdiff_t start;  // of x = 0 of the top border row, from the buffer
+    };
+    const Case cases[] = {
+        {PixelType::kU8, 0, 0, 0},    {PixelType::kU8, 0, 8, 24},   {PixelType::kU8, 3, 0, 32},
+        {PixelType::kU8, 3, 8, 24},   {PixelType::kU8, 3, 31, 33},  {PixelType::kU8, 24, 8, 24},
+        {PixelType::kU8, 25, 8, 56},  {PixelType::kU8, 40, 16, 48}, {PixelType::kU8, 33, 0, 64},
+        {PixelType::kRgb, 8, 24, 40}, {PixelType::kSgl, 2, 24, 8},  {PixelType::kRgbU64, 4, 0, 32},
+    };
+    alignas(32) static std::uint8_t buffer[64];
+    for (const Case& c : cases) {
+        std::uint8_t* from = buffer + c.misalignment;
+        EXPECT_EQ(place_first_pixel(from, {c.type, 0, 0, c.border}, 0) - from, c.start)
+            << static_cast<int>(c.type) << ' ' << c.border << ' ' << c.misalignment;
+    }
+}
+
 TEST(ImageLayoutTest, BuffersEndAt2147483647Bytes) {
     // The largest multiple of 32 that leaves room for the 64 bytes of slack.
     EXPECT_EQ(lay_out({PixelType::kU8, 2147483552, 1, 0}).buffer_bytes, 2147483616U);
