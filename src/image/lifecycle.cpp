@@ -84,8 +84,11 @@ bool take_back_buffer(ImageHandle handle, std::uint8_t* buffer) {
         return true;
     }
     const Pin pin = Registry::instance().pin(Image::object_address(handle));
-    return use_if_live(pin, [](Image& image) { image.give_back(); }) != nullptr ||
-           lent.give_back(handle, buffer);
+    // Asked again, because the image may have gone and its handle come back since then.
+    const auto give_back = [&](Image& image) {
+        if (!lent.give_back_orphan(handle, buffer)) image.give_back();
+    };
+    return use_if_live(pin, give_back) != nullptr || lent.give_back(handle, buffer);
 }
 
 void dispose_image(ImageHandle handle) {
