@@ -63,17 +63,21 @@ TEST(RegistryLockTest, UnpairedRequestsNestAndSkipImagesThatAreGone) {
     Pair images;
     const ImageHandle twice[] = {images.a, images.b, images.a};
     const ImageHandle once[] = {images.a};
-    lock_images(twice);
     lock_images(once);
-    unlock_images(once);
+    lock_images(twice);
+    std::atomic<bool> waiting = false;
     std::atomic<bool> released = false;
     std::thread waiter([&] {
+        waiting = true;
         const LockedImage locked(images.a);
         EXPECT_TRUE(released.load());
     });
     dispose_image(images.b);
-    released = true;
     unlock_images(twice);
+    while (!waiting) std::this_thread::yield();
+    for (int i = 0; i < 200; ++i) std::this_thread::yield();  // time for a wrong entry
+    released = true;
+    unlock_images(once);
     waiter.join();
     unlock_images(once);  // not held: nothing happens
     run_in_thread([&] {
