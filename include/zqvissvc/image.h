@@ -69,9 +69,9 @@ ZQ_API ZqError ZQ_CALL Gen_GetExternalCount(const ZqImageValue* image, int32_t* 
 /* The pool for time-bounded work: sizeKB above 0 reserves it (-1074396089 when there is one), 0 or
  * less releases it (-1074396092 while reservations are live, -1074396090 while it is enabled), also
  * with an error pending. It is released when the host tears the caller down. While enabled, every
- * pixel buffer is carved from it. Resetting makes it forget its reservations (-1074396090 while enabled), also with
- * an error pending: images that still lie in it then share memory with later ones. Enabling (enable
- * = 1; anything else disables) needs a pool: -1074396091. */
+ * pixel buffer is carved from it. Resetting makes it forget its reservations (-1074396090 while
+ * enabled), also with an error pending: images that still lie in it then share memory with later
+ * ones. Enabling (enable = 1; anything else disables) needs a pool: -1074396091. */
 ZQ_API ZqError ZQ_CALL DF_SetMemoryPoolSize(int32_t sizeKB, ZqErrorCluster* error);
 ZQ_API ZqError ZQ_CALL DF_EnableMemoryPool(int32_t enable, ZqErrorCluster* error);
 ZQ_API ZqError ZQ_CALL DF_ResetMemoryPool(ZqErrorCluster* error);
