@@ -2,8 +2,8 @@
 #include <gtest/gtest.h>
 #include <zqvissvc/errors.h>
 
+#include <future>
 #include <memory>
-#include <semaphore>
 #include <string>
 #include <thread>
 
@@ -39,20 +39,20 @@ class LingeringThread {
               ZqImageHandle image = nullptr;
               EXPECT_EQ(calls.new_named(ZQ_TYPE_U8, 9, 9, 0, "locked", 0, &image), 0);
               EXPECT_EQ(calls.lock(&image, 1), 0);
-              ready_.release();
-              go_on_.acquire();
+              ready_.set_value();
+              go_on_.get_future().wait();
           }) {
-        ready_.acquire();
+        ready_.get_future().wait();
     }
     ~LingeringThread() {
-        go_on_.release();
+        go_on_.set_value();
         thread_.join();
     }
     LingeringThread(const LingeringThread&) = delete;
     LingeringThread& operator=(const LingeringThread&) = delete;
 
   private:
-    std::binary_semaphore ready_{0}, go_on_{0};
+    std::promise<void> ready_, go_on_;
     std::thread thread_;
 };
 
