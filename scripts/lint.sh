@@ -13,6 +13,7 @@ check() {
 }
 
 format() { sources | xargs -r clang-format --dry-run -Werror; }
+exports_page() { diff -u docs/exports.md <(scripts/make_exports_page.sh); }
 scripts_clean() { shellcheck -x -S warning dev .ci/run scripts/*.sh scripts/win32/*.sh cmake/*.sh; }
 # A source that this target does not compile has no entry in the compile database.
 tidy() {
@@ -28,6 +29,7 @@ say "lint"
 check "format" format
 check "layers" scripts/check_layers.sh
 check "documentation of the exports" scripts/check_docs.sh
+check "reference page of the exports" exports_page
 check "shell scripts" scripts_clean
 if [[ ${1:-} != --fast ]]; then
     need clang-tidy
