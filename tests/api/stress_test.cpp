@@ -127,6 +127,7 @@ void one_step(Dice& dice, uint8_t mark) {
 
 void run_all(void (*body)(int thread)) {
     std::vector<std::thread> threads;
+    threads.reserve(kThreads);
     for (int t = 0; t < kThreads; ++t) {
         threads.emplace_back(body, t);
     }

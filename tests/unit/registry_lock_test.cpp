@@ -44,6 +44,7 @@ TEST(RegistryLockTest, RequestsInAnyOrderExcludeEachOtherAndEnd) {
     int count_a = 0;
     int count_b = 0;
     std::vector<std::thread> threads;
+    threads.reserve(requests.size());
     for (const auto& request : requests) {
         threads.emplace_back([&] {
             for (int i = 0; i < kRounds; ++i) {
@@ -103,6 +104,7 @@ TEST(RegistryLockTest, WaitersLearnThatTheImageIsGone) {
         const ImageHandle held[] = {images.a};
         lock_images(held);
         std::vector<std::thread> waiters;
+        waiters.reserve(3);
         std::atomic<int> started = 0;
         for (int i = 0; i < 3; ++i) {
             waiters.emplace_back([&] {
@@ -158,6 +160,7 @@ TEST(RegistryLockTest, PrivateImagesAreNotLocked) {
 // and in the end none is left.
 TEST(RegistryLockTest, OneNameCreatedAndDisposedByMany) {
     std::vector<std::thread> threads;
+    threads.reserve(4);
     for (int t = 0; t < 4; ++t) {
         threads.emplace_back([t] {
             for (int i = 0; i < 500; ++i) {

@@ -108,6 +108,7 @@ TEST_F(RegistryTest, AUniqueNameIsTakenOncePerKind) {
 
 TEST_F(RegistryTest, FreedSlotsAreTakenAgainLowestFirstAcrossBlocks) {
     std::vector<std::uintptr_t> addresses;
+    addresses.reserve(100);
     for (int i = 0; i < 100; ++i) {
         addresses.push_back(add("x", std::to_string(i)));
     }
