@@ -69,13 +69,16 @@ wine_setup() {
     local version
     version=$(dpkg-query -W -f='${Version}' wine64 | tr -c 'A-Za-z0-9.\n' -)
     export ZQVISSVC_WINE64=/usr/lib/wine/wine64 WINEDEBUG=-all WINEARCH=win64
-    export WINEPREFIX=$cache/wine-$version WINESERVER=/usr/lib/wine/wineserver64
+    export WINEPREFIX=$cache/wine-headless-$version WINESERVER=/usr/lib/wine/wineserver64
     export WINEDLLOVERRIDES='mscoree=d;mshtml=d;winemenubuilder.exe=d'
     unset DISPLAY
     [[ -e $WINEPREFIX/.complete ]] && return
     say "preparing Wine, once"
     rm -rf "$WINEPREFIX"
     "$ZQVISSVC_WINE64" wineboot.exe --init </dev/null >/dev/null 2>&1 || die "Wine does not start"
+    # Windows that nobody sees, so that message boxes work without a display.
+    "$ZQVISSVC_WINE64" reg.exe add 'HKCU\Software\Wine\Drivers' /v Graphics /d null /f \
+        </dev/null >/dev/null 2>&1 || die "Wine has no registry"
     "$WINESERVER" -w
     touch "$WINEPREFIX/.complete"
 }
