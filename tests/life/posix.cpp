@@ -7,13 +7,18 @@
 #include <filesystem>
 #include <iterator>
 #include <stdexcept>
+#include <string>
 
 #include "process.h"
 
 namespace zqtest {
 namespace {
 
-constexpr const char* kLibrary = "libZqVisSvc.so";
+// By its path beside this program: a sanitizer's dlopen does not look where the program says.
+std::string library() {
+    const auto program = std::filesystem::read_symlink("/proc/self/exe");
+    return program.parent_path().parent_path() / "lib" / "libZqVisSvc.so";
+}
 
 std::size_t open_descriptors() {
     const std::filesystem::directory_iterator entries("/proc/self/fd");
@@ -38,7 +43,7 @@ std::vector<Holding> holdings() {
             {"bytes in heap blocks", mallinfo2().uordblks, 4096}};
 }
 
-LoadedLibrary::LoadedLibrary() : module_(dlopen(kLibrary, RTLD_NOW | RTLD_LOCAL)) {
+LoadedLibrary::LoadedLibrary() : module_(dlopen(library().c_str(), RTLD_NOW | RTLD_LOCAL)) {
     if (module_ == nullptr) throw std::runtime_error(dlerror());
 }
 
@@ -51,7 +56,7 @@ void* LoadedLibrary::address(const char* name, int /*ordinal*/) const {
 }
 
 bool library_is_loaded() {
-    void* module = dlopen(kLibrary, RTLD_NOW | RTLD_NOLOAD);
+    void* module = dlopen(library().c_str(), RTLD_NOW | RTLD_NOLOAD);
     if (module != nullptr) dlclose(module);
     return module != nullptr;
 }
