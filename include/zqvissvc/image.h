@@ -163,8 +163,8 @@ ZQ_API ZqError ZQ_CALL ZqUnlockImages(const ZqImageHandle* images, int32_t count
 
 /* Resizes, to `type` when changeType is not 0. mode 0 plain; 1 keeps the rows when only the height
  * changes; 2 takes the buffer from physically contiguous memory: -1074396158 when its allocator is
- * missing, or has none left; the image then has no pixels. -1074395997 for another mode. Any other
- * failed resize leaves the image as it was. */
+ * missing (the image stays as it was) or has none left (the image then has no pixels). -1074395997
+ * for another mode. Any other failed resize leaves the image as it was. */
 ZQ_API ZqError ZQ_CALL ZqResizeImage(ZqImageHandle image, int32_t width, int32_t height,
                                      uint8_t changeType, int32_t type, int32_t mode);
 
