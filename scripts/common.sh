@@ -139,7 +139,9 @@ build_preset() {
     shift
     prepare_preset "$preset"
     say "building $preset"
-    cmake --preset "$preset" >"$cache/configure.log" || { cat "$cache/configure.log"; return 1; }
+    mkdir -p build
+    local log=build/configure-$preset.log
+    cmake --preset "$preset" >"$log" 2>&1 || { cat "$log"; return 1; }
     cmake --build --preset "$preset" -j "$JOBS" ${1:+--target "$@"}
 }
 

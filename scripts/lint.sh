@@ -20,8 +20,8 @@ tidy() {
     sources | grep -E '\.(cpp|cc)$' | while read -r file; do
         grep -qF "/$file\"" build/native/compile_commands.json && echo "$file"
     done | xargs -r -P "$JOBS" -n 1 clang-tidy -p build/native --quiet 2>&1 |
-        grep -vE '^[0-9]+ warnings? generated|^$' | tee "$cache/tidy.log"
-    ! grep -qE '(warning|error):' "$cache/tidy.log"
+        grep -vE '^[0-9]+ warnings? generated|^$' | tee build/tidy.log
+    ! grep -qE '(warning|error):' build/tidy.log
 }
 
 need git clang-format shellcheck
