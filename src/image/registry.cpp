@@ -224,7 +224,7 @@ Pin Registry::begin_disposal(std::uintptr_t address, Ordinal& ordinal) {
 bool Registry::dispose(std::uintptr_t address) {
     Ordinal ordinal = 0;
     const Pin pin = begin_disposal(address, ordinal);
-    if (!pin) {
+    if (pin.object == nullptr) {
         return false;
     }
     // Those who found the object before wait at the gate, or hold it and still find it to unlock.
