@@ -402,9 +402,9 @@ TEST_F(PngFilesTest, RefusesPicturesThatTheFileCannotHold) {
     };
     for (const Case c : {Case{"\x00\x00\xEA\x60\x00\x00\xEA\x60", 8, 2, kUnreadable},
                          Case{"\x00\x00\xEA\x60\x00\x00\xEA\x60", 1, 0, kUnreadable},
-                         Case{"\x7F\xFF\xFF\xFF\x00\x00\x00\x01", 8, 0, kUnreadable},
+                         Case{"\x1F\xFF\x00\x00\x00\x00\x00\x05", 8, 0, kUnreadable},
                          // more bits than can be counted
-                         Case{"\x7F\xFF\xFF\xFF\x7F\xFF\xFF\xFF", 16, 6, -1074396159}}) {
+                         Case{"\x1F\xFF\x00\x00\x7F\xFF\xFF\xFF", 16, 6, -1074396159}}) {
         std::string header(c.size, 8);
         header += {c.depth, c.colour_type, 0, 0, 0};
         store_bytes(path_, "\x89PNG\r\n\x1A\n" + png_chunk("IHDR", header) +
