@@ -43,7 +43,7 @@ register_qemu() {
 inside() {
     local cache=$1 run=$2 mode=$3 status=0
     shift 3
-    mount -t overlay overlay -o "ro,lowerdir=$cache/root/usr:/usr" /usr
+    mount -t overlay overlay -o "ro,lowerdir=$cache/sysroot/usr:/usr" /usr
     register_qemu "$cache/qemu-i386"
     export WINEPREFIX=$cache/prefix
     mkdir -p "$WINEPREFIX"
@@ -53,7 +53,7 @@ inside() {
         mount -t overlay overlay -o "$layers,userxattr" "$run/prefix"
         WINEPREFIX=$run/prefix
     fi
-    export HOME=$cache/home FONTCONFIG_FILE=$cache/root/etc/fonts/fonts.conf
+    export HOME=$cache/home FONTCONFIG_FILE=$cache/sysroot/etc/fonts/fonts.conf
     export WINEARCH=win32 WINELOADERNOEXEC=1 WINESERVER=$cache/wineserver64
     export WINEDLLOVERRIDES='winemenubuilder.exe,mscoree,mshtml='  # no prompts for add-ons
     export WINEDEBUG=${WINEDEBUG_WIN32:--all}

@@ -1,7 +1,7 @@
 # shellcheck shell=bash disable=SC2034,SC2154
 # Makes the cache of run-win32.sh, which sources this and brings say, cannot, launch and the names
 # that they share. In the cache:
-#   root/           the 32-bit Wine of Debian and all it needs, unpacked; the machine's own package
+#   sysroot/        the 32-bit Wine of Debian and all it needs, unpacked; the machine's own package
 #                   database is not touched
 #   qemu-i386       user-mode qemu of version 9 or later; Debian 12's own, 7.2, cannot run Wine
 #   wineserver64    the 64-bit Wine server of the same version
@@ -95,18 +95,18 @@ fetch_qemu() {
 lay_out() {
     local part package
     say "unpacking"
-    mkdir -p "$cache/home" "$cache"/root/usr/{bin,sbin,lib}
-    for part in bin sbin lib; do ln -s "usr/$part" "$cache/root/$part"; done
+    mkdir -p "$cache/home" "$cache"/sysroot/usr/{bin,sbin,lib}
+    for part in bin sbin lib; do ln -s "usr/$part" "$cache/sysroot/$part"; done
     for package in "$tmp"/i386/archives/*.deb; do
-        unpack "$package" "$cache/root" || cannot "could not unpack $package"
+        unpack "$package" "$cache/sysroot" || cannot "could not unpack $package"
     done
     unpack "$tmp"/amd64/wine64_*.deb "$tmp/amd64" ./usr/lib/wine/wineserver64 ||
         cannot "no wineserver64 in wine64"
     mv "$tmp/amd64/usr/lib/wine/wineserver64" "$cache/wineserver64"
     # As the package's install script would do: marks the compression DLL as Wine's own.
-    local zlib=$cache/root/usr/i686-w64-mingw32/lib/zlib1.dll
+    local zlib=$cache/sysroot/usr/i686-w64-mingw32/lib/zlib1.dll
     { head -c 64 "$zlib"; printf 'Wine builtin DLL'; head -c 16 /dev/zero; tail -c +97 "$zlib"; } \
-        >"$cache/root/usr/lib/i386-linux-gnu/wine/i386-windows/zlib1.dll"
+        >"$cache/sysroot/usr/lib/i386-linux-gnu/wine/i386-windows/zlib1.dll"
 }
 
 # Without headers and libraries an ordinary 64-bit gcc can make 32-bit code.
@@ -131,7 +131,7 @@ make_prefix() {
 make_cache() {
     local begin=$SECONDS log=$cache/make.log tmp=$cache/tmp
     : >"$log"
-    rm -rf "$tmp" "${cache:?}"/{root,prefix,home,qemu-i386,wineserver64,trap_number.so}
+    rm -rf "$tmp" "${cache:?}"/{sysroot,prefix,home,qemu-i386,wineserver64,trap_number.so}
     mkdir -p "$tmp"
     fetch_wine
     fetch_qemu
