@@ -16,6 +16,8 @@ struct Calls {
           new_named(library.find<decltype(NewNamedImage)>("NewNamedImage", 3)),
           dispose_image(library.find<decltype(ZqDisposeImage)>("ZqDisposeImage", 6)),
           lock(library.find<decltype(ZqLockImages)>("ZqLockImages", 8)),
+          unlock(library.find<decltype(ZqUnlockImages)>("ZqUnlockImages", 9)),
+          set_memory_mode(library.find<decltype(ZqSetMemoryMode)>("ZqSetMemoryMode", 18)),
           write(library.find<decltype(ZqWriteFileByName)>("ZqWriteFileByName", 60)),
           read(library.find<decltype(ZqReadFile)>("ZqReadFile", 62)) {}
 
@@ -25,6 +27,8 @@ struct Calls {
     decltype(NewNamedImage)* new_named;
     decltype(ZqDisposeImage)* dispose_image;
     decltype(ZqLockImages)* lock;
+    decltype(ZqUnlockImages)* unlock;
+    decltype(ZqSetMemoryMode)* set_memory_mode;
     decltype(ZqWriteFileByName)* write;
     decltype(ZqReadFile)* read;
 };
