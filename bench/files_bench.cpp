@@ -13,9 +13,13 @@
 #include <memory>
 #include <string>
 
+#include "image.h"
 #include "paired.h"
 
 namespace {
+
+using zqbench::check;
+using zqbench::Image;
 
 constexpr int32_t kWidth = 4000;
 constexpr int32_t kHeight = 3000;
@@ -24,31 +28,6 @@ constexpr int kLevel = 6;
 std::string temporary(const char* name) {
     return (std::filesystem::temp_directory_path() / name).string();
 }
-
-void check(bool good, const char* what) {
-    if (good) return;
-    std::fprintf(stderr, "files_bench: %s failed\n", what);
-    std::abort();
-}
-
-class Image {
-  public:
-    explicit Image(int32_t type, int32_t width = 0, int32_t height = 0) {
-        check(NewImage(type, width, height, 3, &handle_) == 0, "NewImage");
-    }
-    ~Image() { ZqDisposeImage(handle_); }
-    Image(const Image&) = delete;
-    Image& operator=(const Image&) = delete;
-
-    ZqImageHandle handle() const { return handle_; }
-    uint8_t* row(int32_t y) const {
-        constexpr ptrdiff_t kBytes[] = {1, 2, 4, 8, 4, 4, 8};
-        return handle_->firstPixel + kBytes[handle_->type] * handle_->rowPixels * y;
-    }
-
-  private:
-    ZqImageHandle handle_ = nullptr;
-};
 
 // Like a photograph: soft shapes and the noise of a sensor.
 void paint(const Image& image) {

@@ -1,12 +1,12 @@
 // Fast rows against the obvious loops, for every target that this processor runs.
 #include <gtest/gtest.h>
-#include <hwy/targets.h>
 
 #include <random>
 #include <vector>
 
 #include "kernels/colour_rows.h"
 #include "kernels/colour_rows_scalar.h"
+#include "support/simd_targets.h"
 
 namespace zq {
 namespace {
@@ -14,8 +14,7 @@ namespace {
 TEST(Kernels, ColourRowsEqualThePlainLoopAndStayInside) {
     constexpr std::uint8_t kGuard = 0xA5;
     std::mt19937 random(3);
-    for (const std::int64_t target : hwy::SupportedAndGeneratedTargets()) {
-        hwy::SetSupportedTargetsForTest(target);
+    zqtest::on_every_simd_target([&] {
         for (std::size_t pixels = 0; pixels <= 200; ++pixels) {
             std::vector<std::uint8_t> source(3 * pixels);
             for (auto& byte : source) byte = static_cast<std::uint8_t>(random());
@@ -23,10 +22,9 @@ TEST(Kernels, ColourRowsEqualThePlainLoopAndStayInside) {
             std::vector<std::uint8_t> actual = expected;
             scalar::rgb_to_bgra(source.data(), expected.data() + 1, pixels);
             rgb_to_bgra(source.data(), actual.data() + 1, pixels);
-            ASSERT_EQ(actual, expected) << hwy::TargetName(target) << ", " << pixels;
+            ASSERT_EQ(actual, expected) << pixels << " pixels";
         }
-    }
-    hwy::SetSupportedTargetsForTest(0);
+    });
 }
 
 }  // namespace
