@@ -2,6 +2,7 @@
 #ifndef ZQVISSVC_ZQVISSVC_H
 #define ZQVISSVC_ZQVISSVC_H
 
+#include "bayer.h"
 #include "errors.h"
 #include "files.h"
 #include "host.h"

@@ -50,4 +50,12 @@ enum GRLIBError_enum : std::int32_t {
     kBufferExtension = -1074397113,        // 0xBFF60047
     kBufferMode = -1074397106,             // 0xBFF6004E
     kBufferWriteFailed = -1074397104,      // 0xBFF60050
+    // The same family, of Bayer decoding.
+    kBayerSize = -1074397148,         // 0xBFF60024
+    kBayerRedGain = -1074397075,      // 0xBFF6006D
+    kBayerGreenGain = -1074397074,    // 0xBFF6006E
+    kBayerBlueGain = -1074397073,     // 0xBFF6006F
+    kBayerBitDepth = -1074397056,     // 0xBFF60080
+    kBayerNullPointer = -1074397027,  // 0xBFF6009D
+    kBayerPattern = -1074396950,      // 0xBFF600EA
 };
