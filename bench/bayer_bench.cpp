@@ -1,0 +1,80 @@
+// Bayer decoding with tables, beside a copy of the same bytes and OpenCV's decoder followed by its
+// way to the same range of values.
+// Run: zqvis_bench --benchmark_filter=Bayer
+#include <benchmark/benchmark.h>
+#include <zqvissvc/bayer.h>
+
+#include <array>
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <vector>
+
+#include "image.h"
+#include "opencv/jobs.h"
+#include "throughput.h"
+
+namespace {
+
+using zqbench::check;
+using zqbench::Image;
+using zqbench::kHeight;
+using zqbench::kWidth;
+
+struct Tables {
+    explicit Tables(uint32_t bit_depth) {
+        for (auto& table : colours) table.resize(bit_depth > 8 ? 65536 : 256);
+        check(Gen_CalculateBayerColorLUT(1.8, 1.0, 1.5, colours[0].data(), colours[1].data(),
+                                         colours[2].data(), bit_depth) == 0,
+              "Gen_CalculateBayerColorLUT");
+    }
+    std::array<std::vector<uint32_t>, 3> colours;
+};
+
+void decode(const Image& source, const Image& target, const Tables& tables, uint32_t bit_depth) {
+    const auto line_width = [](const Image& image) {
+        return static_cast<uint32_t>(image.handle()->rowPixels);
+    };
+    check(Gen_BayerColorDecode(reinterpret_cast<uint32_t*>(target.row(0)), source.row(0), kHeight,
+                               kWidth, line_width(target), line_width(source),
+                               tables.colours[0].data(), tables.colours[1].data(),
+                               tables.colours[2].data(), 2, bit_depth) == 0,
+          "Gen_BayerColorDecode");
+}
+
+// `linear`: the library's own tables. Otherwise one entry is off, so that all are looked up.
+void compare(benchmark::State& state, uint32_t bit_depth, bool linear) {
+    const bool is_wide = bit_depth > 8;
+    const Image source(is_wide ? ZQ_TYPE_I16 : ZQ_TYPE_U8, kWidth, kHeight);
+    const Image target(ZQ_TYPE_RGB, kWidth, kHeight);
+    zqbench::fill_with_noise(source);
+    Tables tables(bit_depth);
+    if (!linear) tables.colours[0].back() ^= 0x10000;
+    zqbench::run_compared(state, [&] { decode(source, target, tables, bit_depth); },
+                          {zqbench::memcpy_of(is_wide ? 6 : 5),
+                           {"OpenCV", zqbench::opencv_bayer(is_wide ? "16 bits" : "8 bits")}});
+}
+
+void add(const char* name, uint32_t bit_depth, bool linear) {
+    benchmark::RegisterBenchmark(
+        name, [=](benchmark::State& state) { compare(state, bit_depth, linear); })
+        ->UseManualTime()
+        ->Unit(benchmark::kMillisecond)
+        ->Iterations(31);
+}
+
+void BayerTables(benchmark::State& state) {
+    for (auto step : state) benchmark::DoNotOptimize(Tables(16));
+}
+BENCHMARK(BayerTables)->Unit(benchmark::kMicrosecond);
+
+[[maybe_unused]] const bool kAdded = [] {
+    add("BayerDecode/8 bits", 8, true);
+    add("BayerDecode/8 bits, any tables", 8, false);
+    add("BayerDecode/12 bits", 12, true);
+    add("BayerDecode/16 bits", 16, true);
+    add("BayerDecode/16 bits, any tables", 16, false);
+    return true;
+}();
+
+}  // namespace
