@@ -166,6 +166,55 @@ TEST(Tool, ConvertsPixelTypesAndPassesOptionsOn) {
     EXPECT_EQ(folder.dump("large"), folder.dump("even.png"));
 }
 
+// Two rows of four pixels that all are red 10, green 20, blue 30, as each pattern has them.
+TEST(Tool, DecodesMosaics) {
+    const ToolFolder folder;
+    const std::array<std::string, 4> mosaics = {
+        "\x14\x1E\x14\x1E\x0A\x14\x0A\x14", "\x14\x0A\x14\x0A\x1E\x14\x1E\x14",
+        "\x1E\x14\x1E\x14\x14\x0A\x14\x0A", "\x0A\x14\x0A\x14\x14\x1E\x14\x1E"};
+    const auto pixels = [](const std::string& pixel, size_t count) {
+        std::string all;
+        while (count-- > 0) all += pixel;
+        return all;
+    };
+    for (size_t pattern = 0; pattern < mosaics.size(); ++pattern) {
+        zqtest::store_bytes(folder.path("8.raw"), mosaics.at(pattern));
+        std::string wide;  // 12 bits, 16 times the value and a half
+        for (const char value : mosaics.at(pattern)) {
+            wide += static_cast<char>(value << 4 | 8);
+            wide += static_cast<char>(value >> 4);
+        }
+        zqtest::store_bytes(folder.path("12.raw"), wide + "more");
+        const std::string options = " --pattern " + std::to_string(pattern) + " --size ";
+        run_cases(
+            folder,
+            {
+                {("bayer @8.raw -o @8.png" + options + "4x2").c_str(), 0, "", ""},
+                {("bayer @12.raw -o @12.aipd --bits 12 --gains 2,1,0.5" + options + "4x2").c_str(),
+                 0, "", ""},
+                {("bayer @8.raw -o @1.png" + options + "1x1").c_str(), 0, "", ""},
+                {("bayer @8.raw -o @cut.png" + options + "3x3").c_str(), 1, "",
+                 Eq("zqvis: " + folder.path("8.raw") + ": Unable to read data. (-1074395989)\n")},
+            });
+        EXPECT_EQ(folder.dump("8.png"), pixels(std::string("\x1E\x14\x0A\0", 4), 8));
+        EXPECT_EQ(folder.dump("12.aipd"), pixels(std::string("\x0F\x14\x15\0", 4), 8));
+        // A single row is its own neighbour.
+        EXPECT_EQ(folder.dump("1.png"), pixels(mosaics.at(pattern).substr(0, 1), 3) + '\0');
+    }
+    const std::string valid = "bayer @8.raw -o @8.png --size 4x2 --pattern 0 ";
+    for (const char* wrong :
+         {"--gains 1,3.999,1", "--gains 1,1", "--gains 1,nan,1", "--bits 0", "--bits 17"}) {
+        EXPECT_EQ(folder.run(valid + wrong).status, 2) << wrong;
+    }
+    run_cases(folder,
+              {
+                  {"bayer @8.raw -o @a.png --size 4x2 --pattern 4", 2, "", HasSubstr("4")},
+                  {"bayer @8.raw -o @a.png --size 4x --pattern 0", 2, "", HasSubstr("4x")},
+                  {"bayer @8.raw -o @a.png --size 0x2 --pattern 0", 2, "", HasSubstr("0x2")},
+                  {"bayer @8.raw -o - --size 4x2 --pattern 0", 2, "", HasSubstr("--format")},
+              });
+}
+
 TEST(Tool, LeavesGoodFilesWhenItFails) {
     const ToolFolder folder;
     const std::string good = folder.bytes("grey.png");

@@ -14,6 +14,7 @@ struct Session {
 void add_info(CLI::App& tool, Session& session);
 void add_convert(CLI::App& tool, Session& session);
 void add_dump(CLI::App& tool, Session& session);
+void add_bayer(CLI::App& tool, Session& session);
 void add_error(CLI::App& tool, Session& session);
 
 #endif

@@ -20,6 +20,7 @@ int run(int argc, char** argv) {
     add_info(tool, session);
     add_convert(tool, session);
     add_dump(tool, session);
+    add_bayer(tool, session);
     add_error(tool, session);
     try {
         tool.parse(argc, argv);
