@@ -65,7 +65,8 @@ HWY_INLINE hn::Vec<Pixels> rgb_of(hn::Vec<Pixels> hsl, hn::Vec<Pixels> slopes) {
 
 // Up to kBlock pixels, a multiple of the vector. All slopes are looked up beforehand: gathering
 // them by vector took twice the time with AVX-512 on a Zen 5 processor.
-HWY_INLINE void convert_block(const std::uint8_t* lsha, std::uint8_t* bgra, std::size_t pixels) {
+HWY_INLINE void convert_hsl_block(const std::uint8_t* lsha, std::uint8_t* bgra,
+                                  std::size_t pixels) {
     HWY_ALIGN std::uint32_t slopes[kBlock];
     for (std::size_t i = 0; i < pixels; ++i) slopes[i] = kHueSlopes[lsha[4 * i + 2]];
     for (std::size_t i = 0; i < pixels; i += hn::Lanes(Pixels())) {
@@ -74,7 +75,7 @@ HWY_INLINE void convert_block(const std::uint8_t* lsha, std::uint8_t* bgra, std:
 }
 
 void hsl_to_rgb(const std::uint8_t* lsha, std::uint8_t* bgra, std::size_t pixels) {
-    convert_padded(lsha, bgra, pixels, convert_block);
+    convert_padded(lsha, bgra, pixels, convert_hsl_block);
 }
 
 }  // namespace zq::HWY_NAMESPACE

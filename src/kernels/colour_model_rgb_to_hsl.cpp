@@ -71,22 +71,23 @@ HWY_INLINE hn::Vec<Pixels> is_rounded_up_in_tie(hn::Vec<Pixels> saturation) {
     const Pixels tag;
 #if HWY_TARGET == HWY_SCALAR  // has no vector of 4 bytes
     const std::uint32_t n = hn::GetLane(saturation);
-    const auto bit = hn::Set(tag, kTiesRoundedDown[n / 8] & 1U << n % 8);
+    const auto bit = hn::Set(
+        tag, (n < 128 ? kTiesRoundedDown : kTiesRoundedDownFrom128)[n % 16] & 1U << n / 16 % 8);
 #else
     alignas(16) static constexpr std::uint8_t kBits[16] = {1, 2, 4, 8, 16, 32, 64, 128};
+    alignas(16) static constexpr std::uint8_t kBitsFrom128[16] = {0, 0, 0, 0, 0,  0,  0,  0,
+                                                                  1, 2, 4, 8, 16, 32, 64, 128};
     const hn::Repartition<std::uint8_t, Pixels> byte_tag;
-    const auto look_up = [&](const std::uint8_t* table, hn::Vec<Pixels> index) HWY_ATTR {
-        return hn::TableLookupBytesOr0(hn::LoadDup128(byte_tag, table),
-                                       hn::BitCast(byte_tag, index));
+    const auto row = hn::BitCast(byte_tag, hn::And(saturation, hn::Set(tag, 15)));
+    const auto column = hn::BitCast(byte_tag, hn::ShiftRight<4>(saturation));
+    const auto look_up = [&](const std::uint8_t* rows, const std::uint8_t* columns) HWY_ATTR {
+        return hn::And(hn::TableLookupBytes(hn::LoadDup128(byte_tag, rows), row),
+                       hn::TableLookupBytes(hn::LoadDup128(byte_tag, columns), column));
     };
-    // A byte of an index that has its upper bit set yields 0: in each half of the table the bytes
-    // that belong to the other half, and the upper three of a lane in both.
-    const auto byte = hn::ShiftRight<3>(saturation);
-    const auto low = look_up(kTiesRoundedDown.data(), hn::Add(byte, hn::Set(tag, 0x80808070U)));
-    const auto high =
-        look_up(kTiesRoundedDown.data() + 16, hn::Add(byte, hn::Set(tag, 0x808080F0U)));
-    const auto mask = look_up(kBits, hn::And(saturation, hn::Set(tag, 7)));
-    const auto bit = hn::BitCast(tag, hn::And(hn::Or(low, high), mask));
+    // The upper three bytes of a lane look up saturation 0, whose bit is not set.
+    const auto bit =
+        hn::BitCast(tag, hn::Or(look_up(kTiesRoundedDown.data(), kBits),
+                                look_up(kTiesRoundedDownFrom128.data(), kBitsFrom128)));
 #endif
     return hn::VecFromMask(tag, hn::Eq(bit, hn::Zero(tag)));
 }
@@ -104,8 +105,8 @@ HWY_INLINE hn::Vec<Pixels> saturation_of(const Planes& p) {
         hn::Mul(hn::NegMulAdd(hn::Set(tag, 3.0F), least, sum), hn::Set(tag, 255.0F));
     const auto value = hn::MulAdd(hn::Div(dividend, divisor), hn::Set(tag, kUpwards), round);
     const auto excess = hn::MulSub(hn::Sub(value, round), divisor, dividend);
-    const auto tie =
-        hn::BitCast(pixel_tag, hn::VecFromMask(tag, hn::Eq(hn::Add(excess, excess), divisor)));
+    const auto tie = hn::VecFromMask(
+        pixel_tag, hn::RebindMask(pixel_tag, hn::Eq(hn::Add(excess, excess), divisor)));
     const auto saturation = hn::And(hn::BitCast(pixel_tag, value), hn::Set(pixel_tag, 255));
     const auto minus_one = hn::AndNot(is_rounded_up_in_tie(saturation), tie);
     return hn::Add(saturation, minus_one);
@@ -169,7 +170,8 @@ HWY_INLINE Converted convert(hn::Vec<Pixels> rgb) {
 
 // Up to kBlock pixels, a multiple of the vector. Ties are few but come at no time that the
 // processor could foresee: they are put aside, with no branch, and settled at the end.
-HWY_INLINE void convert_block(const std::uint8_t* bgra, std::uint8_t* lsha, std::size_t pixels) {
+HWY_INLINE void convert_rgb_block(const std::uint8_t* bgra, std::uint8_t* lsha,
+                                  std::size_t pixels) {
     const Pixels tag;
     const std::size_t lanes = hn::Lanes(tag);
     HWY_ALIGN std::uint32_t rgb_of_ties[kBlock];
@@ -190,7 +192,7 @@ HWY_INLINE void convert_block(const std::uint8_t* bgra, std::uint8_t* lsha, std:
 }
 
 void rgb_to_hsl(const std::uint8_t* bgra, std::uint8_t* lsha, std::size_t pixels) {
-    convert_padded(bgra, lsha, pixels, convert_block);
+    convert_padded(bgra, lsha, pixels, convert_rgb_block);
 }
 
 }  // namespace zq::HWY_NAMESPACE
