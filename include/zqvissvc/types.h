@@ -55,6 +55,38 @@ typedef struct ZqArrayU32 {
     uint32_t elements[1];
 } ZqArrayU32;
 typedef ZqArrayU32** ZqArrayU32Handle;
+typedef struct ZqArrayI32 {
+    int32_t count;
+    int32_t elements[1];
+} ZqArrayI32;
+typedef ZqArrayI32** ZqArrayI32Handle;
+
+/* Two-dimensional host arrays: rows * columns elements, row by row. */
+typedef struct ZqArray2dU8 {
+    int32_t rows, columns;
+    uint8_t elements[1];
+} ZqArray2dU8;
+typedef ZqArray2dU8** ZqArray2dU8Handle;
+typedef struct ZqArray2dI16 {
+    int32_t rows, columns;
+    int16_t elements[1];
+} ZqArray2dI16;
+typedef ZqArray2dI16** ZqArray2dI16Handle;
+typedef struct ZqArray2dSgl {
+    int32_t rows, columns;
+    float elements[1];
+} ZqArray2dSgl;
+typedef ZqArray2dSgl** ZqArray2dSglHandle;
+typedef struct ZqArray2dU32 {
+    int32_t rows, columns;
+    uint32_t elements[1];
+} ZqArray2dU32;
+typedef ZqArray2dU32** ZqArray2dU32Handle;
+typedef struct ZqArray2dU64 {
+    int32_t rows, columns;
+    uint64_t elements[1];
+} ZqArray2dU64;
+typedef ZqArray2dU64** ZqArray2dU64Handle;
 
 /* The host's error record, packed: status (1 error, 0 none) at byte 0, code at byte 1, source text
  * at byte 5. */

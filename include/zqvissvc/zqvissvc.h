@@ -3,6 +3,7 @@
 #define ZQVISSVC_ZQVISSVC_H
 
 #include "bayer.h"
+#include "convert.h"
 #include "errors.h"
 #include "files.h"
 #include "host.h"

@@ -20,6 +20,7 @@ enum GRLIBError_enum : std::int32_t {
     kPoolMissing = -1074396091,
     kPoolEnabled = -1074396090,
     kPoolExists = -1074396089,
+    kOutputArrayTooSmall = -1074396088,
     kPaletteNeeds8Bit = -1074396082,
     kInvalidImageType = -1074396080,
     kIncompatibleImageType = -1074396077,

@@ -1,9 +1,8 @@
 // Conversion of whole images.
 #include "convert/convert_image.h"
 
-#include <cstring>
-
 #include "convert/convert_rows.h"
+#include "convert/copy_rows.h"
 
 namespace zq {
 
@@ -22,11 +21,63 @@ void take_shape(const Image& source, Image& destination) {
     }
 }
 
-void copy_rows(const Image& source, Image& destination) {
-    const auto bytes = static_cast<std::size_t>(source.record().width) *
-                       static_cast<std::size_t>(bytes_per_pixel(source.type()));
+std::size_t pixel_count(const Image& image) {
+    return static_cast<std::size_t>(image.record().width) *
+           static_cast<std::size_t>(image.record().height);
+}
+
+Destination destination_of(const Image& image) {
+    return destination_for(pixel_count(image) *
+                           static_cast<std::size_t>(bytes_per_pixel(image.type())));
+}
+
+std::uint8_t* first_border_pixel(const Image& image) {
+    const std::int32_t border = image.record().border;
+    return image.row(-border) - std::ptrdiff_t{border} * bytes_per_pixel(image.type());
+}
+
+void copy_with_border(const Image& source, const Image& destination) {
+    const auto with_border = [&](std::int32_t size) {
+        return static_cast<std::size_t>(size) +
+               2 * static_cast<std::size_t>(source.record().border);
+    };
+    copy_rows({first_border_pixel(source), source.row_stride()},
+              {first_border_pixel(destination), destination.row_stride()},
+              with_border(source.record().height),
+              with_border(source.record().width) *
+                  static_cast<std::size_t>(bytes_per_pixel(source.type())));
+}
+
+void convert_rows(const Image& source, Image& destination) {
+    RowConverter converter(source.type(), destination.type(), {.bit_depth = source.bit_depth()},
+                           destination_of(destination));
+    const auto width = static_cast<std::size_t>(source.record().width);
     for (std::int32_t y = 0; y < source.record().height; ++y) {
-        std::memcpy(destination.row(y), source.row(y), bytes);
+        converter.convert(source.row(y), destination.row(y), width);
+    }
+}
+
+// Each row goes at once where the exchange of the quadrants would take it.
+void render_spectrum(const Image& source, Image& destination) {
+    RowConverter converter(PixelType::kComplex, PixelType::kRgb,
+                           {.scale = 128.0 / static_cast<double>(pixel_count(source))},
+                           destination_of(destination));
+    const std::int32_t height = source.record().height;
+    const std::int32_t half_height = height / 2;
+    const auto width = static_cast<std::size_t>(source.record().width);
+    const std::size_t half = width / 2;
+    constexpr std::size_t kFrom = kBytesPerPixel[3], kTo = kBytesPerPixel[4];
+    for (std::int32_t y = 0; y < height; ++y) {
+        const bool moves = y < 2 * half_height;
+        const std::size_t moved = moves ? half : 0;
+        const std::uint8_t* from = source.row(y);
+        if (moves) {
+            std::uint8_t* to = destination.row((y + half_height) % (2 * half_height));
+            converter.convert(from, to + moved * kTo, moved);
+            converter.convert(from + moved * kFrom, to, moved);
+        }
+        converter.convert(from + 2 * moved * kFrom, destination.row(y) + 2 * moved * kTo,
+                          width - 2 * moved);
     }
 }
 
@@ -34,17 +85,14 @@ void copy_rows(const Image& source, Image& destination) {
 
 void convert_image(Image& source, Image& destination) {
     if (&source == &destination) return;
-    const bool same_type = source.type() == destination.type();
-    const ConvertRow convert_row = find_row_conversion(source.type(), destination.type());
-    if (!same_type && convert_row == nullptr) throw kIncompatibleImageType;
     take_shape(source, destination);
-    if (same_type) {
-        copy_rows(source, destination);
-        return;
-    }
-    const ImageRecord& record = source.record();
-    for (std::int32_t y = 0; y < record.height; ++y) {
-        convert_row(source.row(y), destination.row(y), record.width, source.bit_depth());
+    if (pixel_count(source) == 0) return;
+    if (source.type() == destination.type()) {
+        copy_with_border(source, destination);
+    } else if (source.type() == PixelType::kComplex && destination.type() == PixelType::kRgb) {
+        render_spectrum(source, destination);
+    } else {
+        convert_rows(source, destination);
     }
 }
 

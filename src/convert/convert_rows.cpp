@@ -1,108 +1,169 @@
-// The rules of each pair of pixel types, pixel by pixel. Colours of 16 bits a channel are not
-// scaled when they come from or go to types of other depths, unless a bit depth says so.
+// The chains of kernels behind every pair of pixel types. What lies between two passes stays in the
+// nearest cache. Values of 16 bits a channel are not scaled when they come from or go to types of
+// other depths, unless a bit depth says so.
 #include "convert/convert_rows.h"
 
 #include <algorithm>
-#include <array>
+
+#include "kernels/colour_model.h"
+#include "kernels/from_colour.h"
+#include "kernels/from_float.h"
+#include "kernels/from_i16.h"
+#include "kernels/from_u8.h"
+#include "kernels/stream_copy.h"
 
 namespace zq {
 
 namespace {
 
-// In memory order.
-template <class Channel>
-struct Colour {
-    Channel blue, green, red, alpha;
-};
-using Rgb = Colour<std::uint8_t>;
-using RgbU64 = Colour<std::uint16_t>;
-
-template <class Channel>
-Colour<Channel> grey(Channel value) {
-    return {value, value, value, 0};
-}
-
-template <class Channel>
-std::int32_t mean(const Colour<Channel>& colour) {
-    return (colour.blue + colour.green + colour.red) / 3;
-}
-
-void convert(std::uint8_t from, std::int16_t& to, std::int32_t) {
-    to = from;
-}
-void convert(std::uint8_t from, Rgb& to, std::int32_t) {
-    to = grey(from);
-}
-void convert(std::uint8_t from, RgbU64& to, std::int32_t) {
-    to = grey<std::uint16_t>(from);
-}
-void convert(std::int16_t from, std::uint8_t& to, std::int32_t bit_depth) {
-    to = reduce_to_8_bits(from, bit_depth);
-}
-void convert(std::int16_t from, Rgb& to, std::int32_t bit_depth) {
-    to = grey(reduce_to_8_bits(from, bit_depth));
-}
-void convert(std::int16_t from, RgbU64& to, std::int32_t) {
-    to = grey(static_cast<std::uint16_t>(std::max<std::int16_t>(from, 0)));
-}
-void convert(Rgb from, std::uint8_t& to, std::int32_t) {
-    to = static_cast<std::uint8_t>(mean(from));
-}
-void convert(Rgb from, std::int16_t& to, std::int32_t) {
-    to = static_cast<std::int16_t>(mean(from));
-}
-void convert(Rgb from, RgbU64& to, std::int32_t) {
-    to = {from.blue, from.green, from.red, from.alpha};
-}
-void convert(const RgbU64& from, Rgb& to, std::int32_t bit_depth) {
-    to = {reduce_to_8_bits(from.blue, bit_depth), reduce_to_8_bits(from.green, bit_depth),
-          reduce_to_8_bits(from.red, bit_depth), reduce_to_8_bits(from.alpha, bit_depth)};
-}
-void convert(const RgbU64& from, std::uint8_t& to, std::int32_t bit_depth) {
-    Rgb reduced;
-    convert(from, reduced, bit_depth);
-    to = static_cast<std::uint8_t>(mean(reduced));
-}
-void convert(const RgbU64& from, std::int16_t& to, std::int32_t) {
-    to = static_cast<std::int16_t>(std::min(mean(from), 32767));
-}
+using Pass = RowConverter::Pass;
+using Passes = RowConverter::Passes;
 
 template <class From, class To>
-void convert_row(const void* source, void* destination, std::int32_t width,
-                 std::int32_t bit_depth) {
-    const auto* from = static_cast<const From*>(source);
-    auto* to = static_cast<To*>(destination);
-    for (std::int32_t x = 0; x < width; ++x) convert(from[x], to[x], bit_depth);
+using Kernel = void (*)(const From*, To*, std::size_t);
+
+// A kernel that needs no settings, as a pass.
+template <auto kKernel>
+void plain(const void* from, void* to, std::size_t pixels, const ConversionSettings& /*settings*/) {
+    [&]<class From, class To>(Kernel<From, To> kernel) {
+        kernel(static_cast<const From*>(from), static_cast<To*>(to), pixels);
+    }(kKernel);
 }
 
-struct Conversion {
-    PixelType from;
-    PixelType to;
-    ConvertRow row;
-};
+void reduce_i16(const void* from, void* to, std::size_t pixels,
+                const ConversionSettings& settings) {
+    i16_to_u8(static_cast<const std::int16_t*>(from), static_cast<std::uint8_t*>(to), pixels,
+              Reduction(settings.bit_depth));
+}
 
-constexpr std::array kConversions = {
-    Conversion{PixelType::kU8, PixelType::kI16, convert_row<std::uint8_t, std::int16_t>},
-    Conversion{PixelType::kU8, PixelType::kRgb, convert_row<std::uint8_t, Rgb>},
-    Conversion{PixelType::kU8, PixelType::kRgbU64, convert_row<std::uint8_t, RgbU64>},
-    Conversion{PixelType::kI16, PixelType::kU8, convert_row<std::int16_t, std::uint8_t>},
-    Conversion{PixelType::kI16, PixelType::kRgb, convert_row<std::int16_t, Rgb>},
-    Conversion{PixelType::kI16, PixelType::kRgbU64, convert_row<std::int16_t, RgbU64>},
-    Conversion{PixelType::kRgb, PixelType::kU8, convert_row<Rgb, std::uint8_t>},
-    Conversion{PixelType::kRgb, PixelType::kI16, convert_row<Rgb, std::int16_t>},
-    Conversion{PixelType::kRgb, PixelType::kRgbU64, convert_row<Rgb, RgbU64>},
-    Conversion{PixelType::kRgbU64, PixelType::kU8, convert_row<RgbU64, std::uint8_t>},
-    Conversion{PixelType::kRgbU64, PixelType::kI16, convert_row<RgbU64, std::int16_t>},
-    Conversion{PixelType::kRgbU64, PixelType::kRgb, convert_row<RgbU64, Rgb>},
-};
+// Alpha like the colours.
+void reduce_rgbu64(const void* from, void* to, std::size_t pixels,
+                   const ConversionSettings& settings) {
+    u16_to_u8(static_cast<const std::uint16_t*>(from), static_cast<std::uint8_t*>(to), 4 * pixels,
+              Reduction(settings.bit_depth));
+}
+
+void scaled_magnitude(const void* from, void* to, std::size_t pixels,
+                      const ConversionSettings& settings) {
+    magnitude_to_u8(static_cast<const float*>(from), static_cast<std::uint8_t*>(to), pixels,
+                    settings.scale);
+}
+
+constexpr Pass kU8ToI16 = plain<u8_to_i16>;
+constexpr Pass kU8ToSgl = plain<u8_to_f32>;
+constexpr Pass kU8ToRgb = plain<u8_to_grey32>;
+constexpr Pass kU8ToHsl = plain<u8_to_u32>;
+constexpr Pass kU8ToRgbU64 = plain<u8_to_grey64>;
+constexpr Pass kU16ToRgbU64 = plain<u16_to_grey64>;
+constexpr Pass kSglToU8 = plain<f32_to_u8>;
+constexpr Pass kSglToComplex = plain<f32_to_complex>;
+constexpr Pass kRgbToU8 = plain<rgb_to_mean_u8>;
+constexpr Pass kRgbToSgl = plain<rgb_to_mean_f32>;
+constexpr Pass kRgbToHsl = plain<rgb_to_hsl>;
+constexpr Pass kRgbToRgbU64 = plain<rgb_to_rgbu64>;
+constexpr Pass kHslToU8 = plain<hsl_to_luminance>;
+constexpr Pass kHslToRgb = plain<hsl_to_rgb>;
+
+// By source, then destination, both in the order of the type codes.
+constexpr std::array<std::array<Passes, 7>, 7> kChains = {{
+    // U8
+    {{{},
+      {kU8ToI16},
+      {kU8ToSgl},
+      {kU8ToSgl, kSglToComplex},
+      {kU8ToRgb},
+      {kU8ToHsl},
+      {kU8ToRgbU64}}},
+    // I16
+    {{{reduce_i16},
+      {},
+      {plain<i16_to_f32>},
+      {plain<i16_to_f32>, kSglToComplex},
+      {reduce_i16, kU8ToRgb},
+      {reduce_i16, kU8ToHsl},
+      {plain<i16_to_u16>, kU16ToRgbU64}}},
+    // SGL
+    {{{kSglToU8},
+      {plain<f32_to_i16>},
+      {},
+      {kSglToComplex},
+      {kSglToU8, kU8ToRgb},
+      {kSglToU8, kU8ToHsl},
+      {plain<f32_to_u16>, kU16ToRgbU64}}},
+    // Complex
+    {{{scaled_magnitude},
+      {plain<magnitude_to_i16>},
+      {plain<magnitude_to_f32>},
+      {},
+      {scaled_magnitude, kU8ToRgb},
+      {scaled_magnitude, kU8ToHsl},
+      {plain<magnitude_to_u16>, kU16ToRgbU64}}},
+    // RGB
+    {{{kRgbToU8},
+      {kRgbToU8, kU8ToI16},
+      {kRgbToSgl},
+      {kRgbToSgl, kSglToComplex},
+      {},
+      {kRgbToHsl},
+      {kRgbToRgbU64}}},
+    // HSL
+    {{{kHslToU8},
+      {kHslToU8, kU8ToI16},
+      {kHslToU8, kU8ToSgl},
+      {kHslToU8, kU8ToSgl, kSglToComplex},
+      {kHslToRgb},
+      {},
+      {kHslToRgb, kRgbToRgbU64}}},
+    // RGBU64
+    {{{reduce_rgbu64, kRgbToU8},
+      {plain<rgbu64_to_mean_i16>},
+      {plain<rgbu64_to_mean_f32>},
+      {plain<rgbu64_to_mean_f32>, kSglToComplex},
+      {reduce_rgbu64},
+      {reduce_rgbu64, kRgbToHsl},
+      {}}},
+}};
+
+const Passes& chain(PixelType from, PixelType to) {
+    return kChains[static_cast<std::size_t>(from)][static_cast<std::size_t>(to)];
+}
 
 }  // namespace
 
-ConvertRow find_row_conversion(PixelType from, PixelType to) {
-    for (const Conversion& conversion : kConversions) {
-        if (conversion.from == from && conversion.to == to) return conversion.row;
+RowConverter::RowConverter(PixelType from, PixelType to, const ConversionSettings& settings,
+                           Destination destination)
+    : passes_(chain(from, to)),
+      settings_(settings),
+      destination_(destination),
+      from_bytes_(static_cast<std::size_t>(bytes_per_pixel(from))),
+      to_bytes_(static_cast<std::size_t>(bytes_per_pixel(to))) {}
+
+RowConverter::~RowConverter() {
+    if (destination_ == Destination::kStreamed) finish_streaming();
+}
+
+void RowConverter::convert(const std::uint8_t* from, std::uint8_t* to, std::size_t pixels) {
+    while (pixels > 0) {
+        const std::size_t some = std::min(pixels, kPixelsAtOnce);
+        convert_some(from, to, some);
+        from += some * from_bytes_;
+        to += some * to_bytes_;
+        pixels -= some;
     }
-    return nullptr;
+}
+
+void RowConverter::convert_some(const std::uint8_t* from, std::uint8_t* to, std::size_t pixels) {
+    const void* source = from;
+    std::size_t scratch = 0;
+    for (std::size_t i = 0; i < passes_.size() && passes_[i] != nullptr; ++i) {
+        const bool is_last = i + 1 == passes_.size() || passes_[i + 1] == nullptr;
+        const bool direct = is_last && destination_ == Destination::kCached;
+        void* target = direct ? to : scratch_[scratch].data();
+        passes_[i](source, target, pixels, settings_);
+        source = target;
+        scratch = 1 - scratch;
+    }
+    if (destination_ == Destination::kStreamed) stream_copy(to, source, pixels * to_bytes_);
 }
 
 }  // namespace zq

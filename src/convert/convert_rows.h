@@ -1,29 +1,50 @@
-// Conversions between pixel types, one row at a time.
+// Conversions between pixel types, one row at a time: each pair of types is a chain of kernels.
 #pragma once
 
+#include <array>
+#include <cstddef>
 #include <cstdint>
 
+#include "convert/copy_rows.h"
 #include "image/pixel_type.h"
 
 namespace zq {
 
-// Converts `width` pixels; source and destination are aligned for their types and do not overlap.
-// `bit_depth` is the source image's, 0 when not set.
-using ConvertRow = void (*)(const void* source, void* destination, std::int32_t width,
-                            std::int32_t bit_depth);
+// What a chain needs to know besides the pixels.
+struct ConversionSettings {
+    std::int32_t bit_depth = 0;  // of the source image, 0 when not set
+    double scale = 1.0;          // of a magnitude that becomes 8 bits
+};
 
-// Null for a pair that has no conversion, and for a type to itself.
-ConvertRow find_row_conversion(PixelType from, PixelType to);
+// Converts rows of any length from one type to another; not from a type to itself. One thread at a
+// time. Pixels may have any alignment; source and destination do not overlap.
+class RowConverter {
+  public:
+    RowConverter(PixelType from, PixelType to, const ConversionSettings& settings,
+                 Destination destination);
+    ~RowConverter();
+    RowConverter(const RowConverter&) = delete;
+    RowConverter& operator=(const RowConverter&) = delete;
 
-// A 16-bit sample in 8 bits: clamped without a bit depth; with one, the upper 8 of its bits,
-// rounded half up, and 255 for a sample with bits above its depth.
-constexpr std::uint8_t reduce_to_8_bits(std::int32_t sample, std::int32_t bit_depth) {
-    if (sample < 0) return 0;
-    if (bit_depth == 0) return static_cast<std::uint8_t>(sample > 255 ? 255 : sample);
-    if ((sample & (0xFFFF << bit_depth) & 0xFFFF) != 0) return 255;
-    const std::int32_t value = sample >> (bit_depth - 8);
-    const bool round_up = (sample & (256 >> (17 - bit_depth))) != 0;
-    return static_cast<std::uint8_t>(value + (round_up && value != 255 ? 1 : 0));
-}
+    void convert(const std::uint8_t* from, std::uint8_t* to, std::size_t pixels);
+
+    using Pass = void (*)(const void* from, void* to, std::size_t pixels,
+                          const ConversionSettings& settings);
+    // Those that are not needed are null, at the end.
+    using Passes = std::array<Pass, 3>;
+
+  private:
+    static constexpr std::size_t kPixelsAtOnce = 512;
+    using Scratch = std::array<std::uint8_t, kPixelsAtOnce * 8>;
+
+    void convert_some(const std::uint8_t* from, std::uint8_t* to, std::size_t pixels);
+
+    const Passes& passes_;
+    ConversionSettings settings_;
+    Destination destination_;
+    std::size_t from_bytes_;
+    std::size_t to_bytes_;
+    alignas(64) std::array<Scratch, 2> scratch_;
+};
 
 }  // namespace zq

@@ -17,17 +17,11 @@ using host::FunctionId;
 
 namespace {
 
-// Names are kept zero-terminated, so a host string counts up to its first zero byte.
-std::string_view name_of(ZqStringHandle name) {
-    const std::string_view text = host::view(name);
-    return text.substr(0, text.find('\0'));
-}
-
 // Hands a created image to the host: as a session, as a value, and for disposal at tear-down when
 // it has no name to be found by again. A new image that the host does not take is released again.
 void publish(const Created& created, ZqStringHandle name, ZqImageValue* value) {
     host::register_session(created.image, name);
-    if (name_of(name).empty()) {
+    if (host::name_of(name).empty()) {
         host::dispose_at_teardown(created.image);
     }
     host::copy_string(&value->name, name);
@@ -39,7 +33,7 @@ void create_and_publish(ZqStringHandle name, ZqImageValue* value, Create create)
     if (value == nullptr) {
         throw kNullPointer;
     }
-    const Created created = create(name_of(name));
+    const Created created = create(host::name_of(name));
     try {
         publish(created, name, value);
     } catch (...) {

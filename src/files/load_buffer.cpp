@@ -88,9 +88,8 @@ LoadedBuffer load_buffer(const char* path, std::int32_t mode) {
     const auto accept = [&table](const FileContents& contents) { table = contents.colour_table; };
     throw_if(code_of([&] { image = make_image(type); }), kBufferNotEnoughMemory);
     throw_if(code_of([&] { read_file(path, *image, false, accept); }), kBufferReadFailed);
-    const auto code = code_of([&] { image = converted(std::move(image), type, table); });
-    // A picture of a type that has no way to the wanted one cannot be read in this mode.
-    throw_if(code, code == kIncompatibleImageType ? kBufferReadFailed : kBufferNotEnoughMemory);
+    throw_if(code_of([&] { image = converted(std::move(image), type, table); }),
+             kBufferNotEnoughMemory);
 
     const ImageRecord& record = image->record();
     const LoadedBuffer result = {record.firstPixel, record.width, record.height, record.rowPixels,

@@ -4,6 +4,7 @@
 #include <utility>
 
 #include "host/boundary.h"
+#include "host/host_string.h"
 #include "host/run_hooks.h"
 #include "host/services.h"
 #include "image/image_lock.h"
@@ -40,6 +41,11 @@ bool is_live_image(ImageHandle image) {
 }
 
 }  // namespace
+
+std::string_view name_of(ZqStringHandle name) {
+    const std::string_view text = view(name);
+    return text.substr(0, text.find('\0'));
+}
 
 LookUp look_up(const ZqImageValue* value) {
     const auto to_session = ts_cookie_to_session.find();

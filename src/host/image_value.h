@@ -4,6 +4,8 @@
 
 #include <zqvissvc/types.h>
 
+#include <string_view>
+
 #include "base/error_codes.h"
 #include "image/image.h"
 
@@ -16,6 +18,10 @@ struct LookUp {
     ImageHandle image;
     GRLIBError_enum code;
 };
+
+// The name of an image as a host string gives it: names are kept zero-terminated, so it counts up
+// to its first zero byte. Valid as long as view(name) is.
+std::string_view name_of(ZqStringHandle name);
 
 // The value's image word decides; the host's session only tells whether a null value means
 // anything.

@@ -16,7 +16,7 @@ namespace zq::host {
 inline constexpr std::int32_t kHostOutOfMemory = 2;
 
 // Element types of numeric_array_resize.
-enum class ElementType : std::int32_t { kU8 = 5, kU16 = 6, kU32 = 7, kU64 = 8 };
+enum class ElementType : std::int32_t { kI16 = 2, kU8 = 5, kU16 = 6, kU32 = 7, kU64 = 8, kSgl = 9 };
 
 ZqHandle az_new_handle(std::int32_t size);
 std::int32_t az_set_handle_size(ZqHandle handle, std::int32_t size);

@@ -189,9 +189,8 @@ TEST_F(BufferFilesTest, RefusesLoadsAndLeavesTheOutputs) {
         int32_t mode;
         ZqError code;
     };
-    for (const Case& c : {Case{path_, 0, kReadFailed}, Case{folder_.path("none"), 0, kReadFailed},
-                          Case{"", 4, kReadFailed}, Case{path_, 1, kMode}, Case{path_, 7, kMode},
-                          Case{path_, 0x80, kMode}}) {
+    for (const Case& c : {Case{folder_.path("none"), 0, kReadFailed}, Case{"", 4, kReadFailed},
+                          Case{path_, 1, kMode}, Case{path_, 7, kMode}, Case{path_, 0x80, kMode}}) {
         EXPECT_EQ(
             Gen_LoadBuffer(c.path.c_str(), c.mode, &pixels, &width, nullptr, nullptr, nullptr),
             c.code);

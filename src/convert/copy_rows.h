@@ -1,0 +1,33 @@
+// Copying rectangles of pixels, and when a picture is written past the cache.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+
+namespace zq {
+
+// Whether a destination is written past the cache.
+enum class Destination { kCached, kStreamed };
+
+// Pictures larger than a core's share of the last cache: what is written first would be driven out
+// before anyone reads it, and writing past the cache saves fetching it beforehand.
+inline constexpr std::size_t kStreamedBytes = std::size_t{8} << 20;
+
+constexpr Destination destination_for(std::size_t bytes) {
+    return bytes >= kStreamedBytes ? Destination::kStreamed : Destination::kCached;
+}
+
+// Rows of bytes, `stride` from one to the next.
+struct ConstRows {
+    const std::uint8_t* first;
+    std::ptrdiff_t stride;
+};
+struct Rows {
+    std::uint8_t* first;
+    std::ptrdiff_t stride;
+};
+
+// Copies `bytes` of each of `rows` rows; the two do not overlap.
+void copy_rows(ConstRows from, Rows to, std::size_t rows, std::size_t bytes);
+
+}  // namespace zq
