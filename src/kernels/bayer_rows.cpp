@@ -100,24 +100,42 @@ HWY_INLINE void store(Tag tag, const Bgr<Tag>& even, const Bgr<Tag>& odd, std::u
     }
 }
 
-// The last vector overlaps the one before it, so that only the ends of the row are left over.
-template <class Sample>
+// Looks up what is found at the columns from x on, which are put side by side again for that.
+template <class Sample, class Tag>
+HWY_INLINE void look_up(Tag tag, const Sites<Tag>& sites, const MosaicTables& tables,
+                        std::uint32_t* pixels) {
+    const hn::RepartitionToNarrow<Tag> samples_tag;
+    const auto put = [&](hn::Vec<Tag> first, hn::Vec<Tag> second, Sample* samples) HWY_ATTR {
+        const auto both = hn::Or(first, hn::ShiftLeft<8 * sizeof(Sample)>(second));
+        hn::Store(hn::BitCast(samples_tag, both), samples_tag, samples);
+    };
+    constexpr std::size_t kMost = HWY_MAX_BYTES / sizeof(Sample);
+    HWY_ALIGN Sample own[kMost], green[kMost], other[kMost];
+    put(sites.own.own, sites.green.own, own);
+    put(sites.own.green, sites.green.green, green);
+    put(sites.own.other, sites.green.other, other);
+    for (std::size_t i = 0; i < 2 * hn::Lanes(tag); ++i) {
+        pixels[i] = tables.own[own[i]] | tables.green[green[i]] | tables.other[other[i]];
+    }
+}
+
+// Calls finish(tag, sites, pixels) for whole vectors of columns. The last vector overlaps the one
+// before it, so that only the ends of the row are left over.
+template <class Sample, class Finish>
 HWY_INLINE void decode_row(const MosaicRow<Sample>& row, const MosaicTables& tables,
-                           [[maybe_unused]] const MosaicGains& gains, std::uint32_t* pixels) {
+                           std::uint32_t* pixels, [[maybe_unused]] const Finish& finish) {
     const std::size_t begin = std::min<std::size_t>(row.own_first ? 2 : 1, row.columns);
     std::size_t end = begin;
 #if HWY_TARGET != HWY_SCALAR
     const WideTag<Sample> tag;
     const std::size_t step = 2 * hn::Lanes(tag);
     if (row.columns > begin + step) {
-        const auto decode_at = [&](std::size_t x) HWY_ATTR {
-            const auto sites = interpolate(tag, row, x);
-            store(tag, apply(tag, sites.own, gains), apply(tag, sites.green, gains), pixels + x);
-        };
         const std::size_t room = row.columns - 1 - step - begin;
         const std::size_t last = begin + room - room % 2;
-        for (std::size_t x = begin; x < last; x += step) decode_at(x);
-        decode_at(last);
+        for (std::size_t x = begin; x < last; x += step) {
+            finish(tag, interpolate(tag, row, x), pixels + x);
+        }
+        finish(tag, interpolate(tag, row, last), pixels + last);
         end = last + step;
     }
 #endif
@@ -125,13 +143,37 @@ HWY_INLINE void decode_row(const MosaicRow<Sample>& row, const MosaicTables& tab
     scalar::decode_mosaic_columns(row, tables, end, row.columns, pixels);
 }
 
-void decode_bytes(const MosaicRow<std::uint8_t>& row, const MosaicTables& tables,
-                  const MosaicGains& gains, std::uint32_t* pixels) {
-    decode_row(row, tables, gains, pixels);
+template <class Sample>
+HWY_INLINE void decode_by_tables(const MosaicRow<Sample>& row, const MosaicTables& tables,
+                                 std::uint32_t* pixels) {
+    decode_row(row, tables, pixels, [&](auto tag, const auto& sites, std::uint32_t* at) HWY_ATTR {
+        look_up<Sample>(tag, sites, tables, at);
+    });
 }
-void decode_words(const MosaicRow<std::uint16_t>& row, const MosaicTables& tables,
-                  const MosaicGains& gains, std::uint32_t* pixels) {
-    decode_row(row, tables, gains, pixels);
+
+template <class Sample>
+HWY_INLINE void decode_by_gains(const MosaicRow<Sample>& row, const MosaicTables& tables,
+                                const MosaicGains& gains, std::uint32_t* pixels) {
+    decode_row(row, tables, pixels, [&](auto tag, const auto& sites, std::uint32_t* at) HWY_ATTR {
+        store(tag, apply(tag, sites.own, gains), apply(tag, sites.green, gains), at);
+    });
+}
+
+void look_up_bytes(const MosaicRow<std::uint8_t>& row, const MosaicTables& tables,
+                   std::uint32_t* pixels) {
+    decode_by_tables(row, tables, pixels);
+}
+void look_up_words(const MosaicRow<std::uint16_t>& row, const MosaicTables& tables,
+                   std::uint32_t* pixels) {
+    decode_by_tables(row, tables, pixels);
+}
+void compute_bytes(const MosaicRow<std::uint8_t>& row, const MosaicTables& tables,
+                   const MosaicGains& gains, std::uint32_t* pixels) {
+    decode_by_gains(row, tables, gains, pixels);
+}
+void compute_words(const MosaicRow<std::uint16_t>& row, const MosaicTables& tables,
+                   const MosaicGains& gains, std::uint32_t* pixels) {
+    decode_by_gains(row, tables, gains, pixels);
 }
 
 bool is_clipped_line(const std::uint32_t* table, std::size_t entries, std::uint32_t gain, int shift,
@@ -157,26 +199,28 @@ HWY_AFTER_NAMESPACE();
 #if HWY_ONCE
 namespace zq {
 
-HWY_EXPORT(decode_bytes);
-HWY_EXPORT(decode_words);
+HWY_EXPORT(look_up_bytes);
+HWY_EXPORT(look_up_words);
+HWY_EXPORT(compute_bytes);
+HWY_EXPORT(compute_words);
 HWY_EXPORT(is_clipped_line);
 
 void decode_mosaic_row(const MosaicRow<std::uint8_t>& row, const MosaicTables& tables,
                        std::uint32_t* pixels) {
-    scalar::decode_mosaic_columns(row, tables, 0, row.columns, pixels);
+    HWY_DYNAMIC_DISPATCH(look_up_bytes)(row, tables, pixels);
 }
 void decode_mosaic_row(const MosaicRow<std::uint16_t>& row, const MosaicTables& tables,
                        std::uint32_t* pixels) {
-    scalar::decode_mosaic_columns(row, tables, 0, row.columns, pixels);
+    HWY_DYNAMIC_DISPATCH(look_up_words)(row, tables, pixels);
 }
 
 void decode_mosaic_row(const MosaicRow<std::uint8_t>& row, const MosaicTables& tables,
                        const MosaicGains& gains, std::uint32_t* pixels) {
-    HWY_DYNAMIC_DISPATCH(decode_bytes)(row, tables, gains, pixels);
+    HWY_DYNAMIC_DISPATCH(compute_bytes)(row, tables, gains, pixels);
 }
 void decode_mosaic_row(const MosaicRow<std::uint16_t>& row, const MosaicTables& tables,
                        const MosaicGains& gains, std::uint32_t* pixels) {
-    HWY_DYNAMIC_DISPATCH(decode_words)(row, tables, gains, pixels);
+    HWY_DYNAMIC_DISPATCH(compute_words)(row, tables, gains, pixels);
 }
 
 bool is_clipped_line(const std::uint32_t* table, std::size_t entries, std::uint32_t gain, int shift,

@@ -1,5 +1,5 @@
-// Pixels of a mosaic one by one, through the tables: whole rows where those are no lines, and the
-// ends of rows everywhere.
+// Pixels of a mosaic one by one, through the tables: the ends of rows, and rows that are shorter
+// than vectors.
 #pragma once
 
 #include <algorithm>
