@@ -46,7 +46,7 @@ void decode(const Image& source, const Image& target, const Tables& tables, uint
 }
 
 // `linear`: the library's own tables. Otherwise one entry is off, so that all are looked up.
-void compare(benchmark::State& state, uint32_t bit_depth, bool linear) {
+void BayerDecode(benchmark::State& state, uint32_t bit_depth, bool linear) {
     const bool is_wide = bit_depth > 8;
     const Image source(is_wide ? ZQ_TYPE_I16 : ZQ_TYPE_U8, kWidth, kHeight);
     const Image target(ZQ_TYPE_RGB, kWidth, kHeight);
@@ -58,27 +58,19 @@ void compare(benchmark::State& state, uint32_t bit_depth, bool linear) {
                            {"OpenCV", zqbench::opencv_bayer(is_wide ? "16 bits" : "8 bits")}});
 }
 
-void add(const char* name, uint32_t bit_depth, bool linear) {
-    benchmark::RegisterBenchmark(
-        name, [=](benchmark::State& state) { compare(state, bit_depth, linear); })
-        ->UseManualTime()
-        ->Unit(benchmark::kMillisecond)
-        ->Iterations(31);
+void timed(benchmark::internal::Benchmark* one) {
+    one->UseManualTime()->Unit(benchmark::kMillisecond)->Iterations(31);
 }
+BENCHMARK_CAPTURE(BayerDecode, 8_bits, 8, true)->Apply(timed);
+BENCHMARK_CAPTURE(BayerDecode, 12_bits, 12, true)->Apply(timed);
+BENCHMARK_CAPTURE(BayerDecode, 16_bits, 16, true)->Apply(timed);
+BENCHMARK_CAPTURE(BayerDecode, 8_bits_any_tables, 8, false)->Apply(timed);
+BENCHMARK_CAPTURE(BayerDecode, 16_bits_any_tables, 16, false)->Apply(timed);
 
 void BayerTables(benchmark::State& state) {
     Tables tables(16);
     for (auto step : state) tables.fill(16);
 }
 BENCHMARK(BayerTables)->Unit(benchmark::kMicrosecond);
-
-[[maybe_unused]] const bool kAdded = [] {
-    add("BayerDecode/8 bits", 8, true);
-    add("BayerDecode/8 bits, any tables", 8, false);
-    add("BayerDecode/12 bits", 12, true);
-    add("BayerDecode/16 bits", 16, true);
-    add("BayerDecode/16 bits, any tables", 16, false);
-    return true;
-}();
 
 }  // namespace

@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <array>
+#include <cmath>
 #include <limits>
 #include <optional>
 #include <span>
@@ -33,7 +34,7 @@ bool is_gain(double gain) {
 }
 
 void fill(std::span<std::uint32_t> table, double gain, int shift, int place) {
-    const auto factor = static_cast<std::uint32_t>(gain * 1024.0 + 0.5);
+    const auto factor = static_cast<std::uint32_t>(std::floor(gain * 1024.0 + 0.5));
     for (std::size_t i = 0; i < table.size(); ++i) {
         const std::uint32_t value = (static_cast<std::uint32_t>(i) * factor) >> shift;
         table[i] = std::min(value, 255U) << place;
