@@ -12,7 +12,8 @@ namespace zq {
 // 3 * least / sum = (511 - 2n) / 510, hence one result whatever the colour.
 constexpr bool is_tie_rounded_down(int n) {
     const double quotient = (511 - 2 * n) / 510.0;
-    return static_cast<int>((1 - quotient) * 255 + 0.5) != n;
+    const double saturation = (1 - quotient) * 255 + 0.5;
+    return n > 0 && saturation < n;  // none is negative, so there is no tie at 0
 }
 
 // The answers for 128 saturations from `first` on: of first + 16 * c + r as bit c of byte r.
