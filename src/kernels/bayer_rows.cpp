@@ -107,7 +107,7 @@ HWY_INLINE void look_up(Tag tag, const Sites<Tag>& sites, const MosaicTables& ta
     const hn::RepartitionToNarrow<Tag> samples_tag;
     const auto put = [&](hn::Vec<Tag> first, hn::Vec<Tag> second, Sample* samples) HWY_ATTR {
         const auto both = hn::Or(first, hn::ShiftLeft<8 * sizeof(Sample)>(second));
-        hn::Store(hn::BitCast(samples_tag, both), samples_tag, samples);
+        hn::StoreU(hn::BitCast(samples_tag, both), samples_tag, samples);
     };
     constexpr std::size_t kMost = HWY_MAX_BYTES / sizeof(Sample);
     HWY_ALIGN Sample own[kMost], green[kMost], other[kMost];
