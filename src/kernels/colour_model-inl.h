@@ -22,6 +22,7 @@ namespace hn = hwy::HWY_NAMESPACE;
 using Floats = hn::ScalableTag<float>;
 using Pixels = hn::RebindToUnsigned<Floats>;  // one 4-byte pixel a lane, its first byte lowest
 
+// HWY_ALIGN is a wish: on Windows GCC lays out the stack for 16 bytes whatever a variable asks.
 constexpr std::size_t kMaxLanes = HWY_MAX_BYTES / 4;
 constexpr std::size_t kBlock = 256;  // pixels, a multiple of every vector
 constexpr std::uint32_t kAlphaMask = 0xFF000000U;

@@ -70,7 +70,7 @@ HWY_INLINE void convert_hsl_block(const std::uint8_t* lsha, std::uint8_t* bgra,
     HWY_ALIGN std::uint32_t slopes[kBlock];
     for (std::size_t i = 0; i < pixels; ++i) slopes[i] = kHueSlopes[lsha[4 * i + 2]];
     for (std::size_t i = 0; i < pixels; i += hn::Lanes(Pixels())) {
-        store(rgb_of(load(lsha + 4 * i), hn::Load(Pixels(), slopes + i)), bgra + 4 * i);
+        store(rgb_of(load(lsha + 4 * i), hn::LoadU(Pixels(), slopes + i)), bgra + 4 * i);
     }
 }
 

@@ -38,11 +38,11 @@ HWY_INLINE hn::Vec<Pixels> with_exact_luminance(hn::Vec<Pixels> hsl, hn::Vec<Pix
     const Pixels tag;
     const DoublePixels part_tag;
     HWY_ALIGN std::uint32_t lanes[kMaxLanes];
-    hn::Store(rgb, tag, lanes);
+    hn::StoreU(rgb, tag, lanes);
     for (std::size_t i = 0; i < hn::Lanes(tag); i += hn::Lanes(part_tag)) {
-        hn::Store(exact_luminance(hn::Load(part_tag, lanes + i)), part_tag, lanes + i);
+        hn::StoreU(exact_luminance(hn::LoadU(part_tag, lanes + i)), part_tag, lanes + i);
     }
-    return hn::Or(hn::AndNot(hn::Set(tag, 255), hsl), hn::Load(tag, lanes));
+    return hn::Or(hn::AndNot(hn::Set(tag, 255), hsl), hn::LoadU(tag, lanes));
 }
 
 struct Planes {
@@ -181,12 +181,12 @@ HWY_INLINE void convert_rgb_block(const std::uint8_t* bgra, std::uint8_t* lsha,
         const auto rgb = load(bgra + 4 * i);
         const Converted converted = convert(rgb);
         store(converted.hsl, lsha + 4 * i);
-        hn::Store(rgb, tag, rgb_of_ties + ties * lanes);
+        hn::StoreU(rgb, tag, rgb_of_ties + ties * lanes);
         hsl_of_ties[ties] = lsha + 4 * i;
         ties += converted.tie ? 1 : 0;
     }
     for (std::size_t i = 0; i < ties; ++i) {
-        const auto rgb = hn::Load(tag, rgb_of_ties + i * lanes);
+        const auto rgb = hn::LoadU(tag, rgb_of_ties + i * lanes);
         store(with_exact_luminance(load(hsl_of_ties[i]), rgb), hsl_of_ties[i]);
     }
 }
