@@ -7,6 +7,7 @@
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
+#include <cstring>
 
 namespace zqbench {
 
@@ -38,14 +39,18 @@ class Image {
     ZqImageHandle handle_ = nullptr;
 };
 
-// Pixels of random bytes; the same for every run.
+// Pixels of random bytes, or of random floats from 0 to 256; the same for every run.
 inline void fill_with_noise(const Image& image) {
+    const bool has_floats =
+        image.handle()->type == ZQ_TYPE_SGL || image.handle()->type == ZQ_TYPE_COMPLEX;
     uint32_t random = 1;
     for (int32_t y = 0; y < image.handle()->height; ++y) {
         uint8_t* byte = image.row(y);
-        for (size_t i = 0; i < image.row_bytes(); ++i) {
+        for (size_t i = 0; i < image.row_bytes(); i += has_floats ? 4 : 1) {
             random = random * 1664525U + 1013904223U;
-            byte[i] = static_cast<uint8_t>(random >> 24);
+            const float number = static_cast<float>(random >> 8) / 65536.0F;
+            if (has_floats) std::memcpy(byte + i, &number, sizeof number);
+            if (!has_floats) byte[i] = static_cast<uint8_t>(random >> 24);
         }
     }
 }

@@ -1,8 +1,20 @@
 #!/usr/bin/env bash
-# ./dev bench: builds the native release and runs the benchmarks.
+# ./dev bench [native|win64|win32] [ARGUMENT...]: builds the release of that target and runs its
+# benchmarks, natively beside OpenCV; the 32-bit ones under the emulator, where only ratios between
+# emulated code mean something.
 set -euo pipefail
 . scripts/common.sh
-need libopencv-imgproc-dev
-build_preset native zqvis_bench
-say "benchmarks"
-exec build/native/bin/zqvis_bench "$@"
+target=native
+case ${1:-} in native | win64 | win32) target=$1; shift ;; esac
+[[ $target != native ]] || need libopencv-imgproc-dev
+build_preset "$target" zqvis_bench
+say "benchmarks ($target)"
+cd "build/$target/bin"
+case $target in
+    native) exec ./zqvis_bench "$@" ;;
+    win64) exec "$ZQVISSVC_WINE64" ./zqvis_bench.exe "$@" ;;
+    win32)
+        win32_setup
+        exec "${ZQVISSVC_RUN_WIN32%%;*}" "${ZQVISSVC_RUN_WIN32#*;}" zqvis_bench.exe "$@"
+        ;;
+esac

@@ -26,9 +26,8 @@ std::size_t pixel_count(const Image& image) {
            static_cast<std::size_t>(image.record().height);
 }
 
-Destination destination_of(const Image& image) {
-    return destination_for(pixel_count(image) *
-                           static_cast<std::size_t>(bytes_per_pixel(image.type())));
+Stores stores_into(const Image& image) {
+    return stores_for(pixel_count(image) * static_cast<std::size_t>(bytes_per_pixel(image.type())));
 }
 
 std::uint8_t* first_border_pixel(const Image& image) {
@@ -50,7 +49,7 @@ void copy_with_border(const Image& source, const Image& destination) {
 
 void convert_rows(const Image& source, Image& destination) {
     RowConverter converter(source.type(), destination.type(), {.bit_depth = source.bit_depth()},
-                           destination_of(destination));
+                           stores_into(destination));
     const auto width = static_cast<std::size_t>(source.record().width);
     for (std::int32_t y = 0; y < source.record().height; ++y) {
         converter.convert(source.row(y), destination.row(y), width);
@@ -61,7 +60,7 @@ void convert_rows(const Image& source, Image& destination) {
 void render_spectrum(const Image& source, Image& destination) {
     RowConverter converter(PixelType::kComplex, PixelType::kRgb,
                            {.scale = 128.0 / static_cast<double>(pixel_count(source))},
-                           destination_of(destination));
+                           stores_into(destination));
     const std::int32_t height = source.record().height;
     const std::int32_t half_height = height / 2;
     const auto width = static_cast<std::size_t>(source.record().width);

@@ -12,7 +12,8 @@ namespace zq {
 // same type means a copy, of the border's pixels too, the same image nothing. A complex picture
 // becomes RGB as a spectrum: brightness is the magnitude times 128 over the number of pixels, and
 // the quadrants are exchanged crosswise, so that the origin lies in the centre (of an odd size the
-// last column or row stays where it is). Throws as Image::resize does; the destination is then as it was.
+// last column or row stays where it is). Throws as Image::resize does; the destination is then as
+// it was.
 void convert_image(Image& source, Image& destination);
 
 // The same for palette indices (U8): each pixel of the RGB destination becomes its entry,

@@ -19,35 +19,45 @@ namespace {
 using Pass = RowConverter::Pass;
 using Passes = RowConverter::Passes;
 
-template <class From, class To>
-using Kernel = void (*)(const From*, To*, std::size_t);
+// Kernels that need no settings, as passes.
+template <auto kKernel, class From, class To>
+constexpr Pass pass_of(void (*)(const From*, To*, std::size_t)) {
+    return {[](const void* from, void* to, std::size_t pixels, const ConversionSettings&, Stores) {
+                kKernel(static_cast<const From*>(from), static_cast<To*>(to), pixels);
+            },
+            false};
+}
 
-// A kernel that needs no settings, as a pass.
+template <auto kKernel, class From, class To>
+constexpr Pass pass_of(void (*)(const From*, To*, std::size_t, Stores)) {
+    return {[](const void* from, void* to, std::size_t pixels, const ConversionSettings&,
+               Stores stores) {
+                kKernel(static_cast<const From*>(from), static_cast<To*>(to), pixels, stores);
+            },
+            true};
+}
+
 template <auto kKernel>
-void plain(const void* from, void* to, std::size_t pixels, const ConversionSettings& /*settings*/) {
-    [&]<class From, class To>(Kernel<From, To> kernel) {
-        kernel(static_cast<const From*>(from), static_cast<To*>(to), pixels);
-    }(kKernel);
-}
+constexpr Pass plain = pass_of<kKernel>(kKernel);
 
-void reduce_i16(const void* from, void* to, std::size_t pixels,
-                const ConversionSettings& settings) {
-    i16_to_u8(static_cast<const std::int16_t*>(from), static_cast<std::uint8_t*>(to), pixels,
-              Reduction(settings.bit_depth));
-}
+constexpr Pass kReduceI16 = {
+    [](const void* from, void* to, std::size_t pixels, const ConversionSettings& settings, Stores) {
+        i16_to_u8(static_cast<const std::int16_t*>(from), static_cast<std::uint8_t*>(to), pixels,
+                  Reduction(settings.bit_depth));
+    }};
 
 // Alpha like the colours.
-void reduce_rgbu64(const void* from, void* to, std::size_t pixels,
-                   const ConversionSettings& settings) {
-    u16_to_u8(static_cast<const std::uint16_t*>(from), static_cast<std::uint8_t*>(to), 4 * pixels,
-              Reduction(settings.bit_depth));
-}
+constexpr Pass kReduceRgbU64 = {
+    [](const void* from, void* to, std::size_t pixels, const ConversionSettings& settings, Stores) {
+        u16_to_u8(static_cast<const std::uint16_t*>(from), static_cast<std::uint8_t*>(to),
+                  4 * pixels, Reduction(settings.bit_depth));
+    }};
 
-void scaled_magnitude(const void* from, void* to, std::size_t pixels,
-                      const ConversionSettings& settings) {
-    magnitude_to_u8(static_cast<const float*>(from), static_cast<std::uint8_t*>(to), pixels,
-                    settings.scale);
-}
+constexpr Pass kScaledMagnitude = {
+    [](const void* from, void* to, std::size_t pixels, const ConversionSettings& settings, Stores) {
+        magnitude_to_u8(static_cast<const float*>(from), static_cast<std::uint8_t*>(to), pixels,
+                        settings.scale);
+    }};
 
 constexpr Pass kU8ToI16 = plain<u8_to_i16>;
 constexpr Pass kU8ToSgl = plain<u8_to_f32>;
@@ -75,12 +85,12 @@ constexpr std::array<std::array<Passes, 7>, 7> kChains = {{
       {kU8ToHsl},
       {kU8ToRgbU64}}},
     // I16
-    {{{reduce_i16},
+    {{{kReduceI16},
       {},
       {plain<i16_to_f32>},
       {plain<i16_to_f32>, kSglToComplex},
-      {reduce_i16, kU8ToRgb},
-      {reduce_i16, kU8ToHsl},
+      {kReduceI16, kU8ToRgb},
+      {kReduceI16, kU8ToHsl},
       {plain<i16_to_u16>, kU16ToRgbU64}}},
     // SGL
     {{{kSglToU8},
@@ -91,12 +101,12 @@ constexpr std::array<std::array<Passes, 7>, 7> kChains = {{
       {kSglToU8, kU8ToHsl},
       {plain<f32_to_u16>, kU16ToRgbU64}}},
     // Complex
-    {{{scaled_magnitude},
+    {{{kScaledMagnitude},
       {plain<magnitude_to_i16>},
       {plain<magnitude_to_f32>},
       {},
-      {scaled_magnitude, kU8ToRgb},
-      {scaled_magnitude, kU8ToHsl},
+      {kScaledMagnitude, kU8ToRgb},
+      {kScaledMagnitude, kU8ToHsl},
       {plain<magnitude_to_u16>, kU16ToRgbU64}}},
     // RGB
     {{{kRgbToU8},
@@ -115,12 +125,12 @@ constexpr std::array<std::array<Passes, 7>, 7> kChains = {{
       {},
       {kHslToRgb, kRgbToRgbU64}}},
     // RGBU64
-    {{{reduce_rgbu64, kRgbToU8},
+    {{{kReduceRgbU64, kRgbToU8},
       {plain<rgbu64_to_mean_i16>},
       {plain<rgbu64_to_mean_f32>},
       {plain<rgbu64_to_mean_f32>, kSglToComplex},
-      {reduce_rgbu64},
-      {reduce_rgbu64, kRgbToHsl},
+      {kReduceRgbU64},
+      {kReduceRgbU64, kRgbToHsl},
       {}}},
 }};
 
@@ -131,18 +141,23 @@ const Passes& chain(PixelType from, PixelType to) {
 }  // namespace
 
 RowConverter::RowConverter(PixelType from, PixelType to, const ConversionSettings& settings,
-                           Destination destination)
+                           Stores stores)
     : passes_(chain(from, to)),
       settings_(settings),
-      destination_(destination),
+      stores_(stores),
       from_bytes_(static_cast<std::size_t>(bytes_per_pixel(from))),
       to_bytes_(static_cast<std::size_t>(bytes_per_pixel(to))) {}
 
 RowConverter::~RowConverter() {
-    if (destination_ == Destination::kStreamed) finish_streaming();
+    if (stores_ == Stores::kStreamed) finish_streaming();
 }
 
 void RowConverter::convert(const std::uint8_t* from, std::uint8_t* to, std::size_t pixels) {
+    const bool is_single = passes_[1].run == nullptr;
+    if (is_single && (stores_ == Stores::kCached || passes_[0].can_stream)) {
+        passes_[0].run(from, to, pixels, settings_, stores_);
+        return;
+    }
     while (pixels > 0) {
         const std::size_t some = std::min(pixels, kPixelsAtOnce);
         convert_some(from, to, some);
@@ -152,18 +167,19 @@ void RowConverter::convert(const std::uint8_t* from, std::uint8_t* to, std::size
     }
 }
 
+// What is narrower than its source, or has come through several passes, is written past the cache
+// in whole blocks: single narrow stores do not fill the lines.
 void RowConverter::convert_some(const std::uint8_t* from, std::uint8_t* to, std::size_t pixels) {
     const void* source = from;
     std::size_t scratch = 0;
-    for (std::size_t i = 0; i < passes_.size() && passes_[i] != nullptr; ++i) {
-        const bool is_last = i + 1 == passes_.size() || passes_[i + 1] == nullptr;
-        const bool direct = is_last && destination_ == Destination::kCached;
-        void* target = direct ? to : scratch_[scratch].data();
-        passes_[i](source, target, pixels, settings_);
+    for (std::size_t i = 0; i < passes_.size() && passes_[i].run != nullptr; ++i) {
+        const bool is_last = i + 1 == passes_.size() || passes_[i + 1].run == nullptr;
+        void* target = is_last && stores_ == Stores::kCached ? to : scratch_[scratch].data();
+        passes_[i].run(source, target, pixels, settings_, Stores::kCached);
         source = target;
         scratch = 1 - scratch;
     }
-    if (destination_ == Destination::kStreamed) stream_copy(to, source, pixels * to_bytes_);
+    if (stores_ == Stores::kStreamed) stream_copy(to, source, pixels * to_bytes_);
 }
 
 }  // namespace zq

@@ -20,17 +20,20 @@ struct ConversionSettings {
 // time. Pixels may have any alignment; source and destination do not overlap.
 class RowConverter {
   public:
-    RowConverter(PixelType from, PixelType to, const ConversionSettings& settings,
-                 Destination destination);
+    RowConverter(PixelType from, PixelType to, const ConversionSettings& settings, Stores stores);
     ~RowConverter();
     RowConverter(const RowConverter&) = delete;
     RowConverter& operator=(const RowConverter&) = delete;
 
     void convert(const std::uint8_t* from, std::uint8_t* to, std::size_t pixels);
 
-    using Pass = void (*)(const void* from, void* to, std::size_t pixels,
-                          const ConversionSettings& settings);
-    // Those that are not needed are null, at the end.
+    // One kernel. `stores` counts only for those that can write past the cache.
+    struct Pass {
+        void (*run)(const void* from, void* to, std::size_t pixels,
+                    const ConversionSettings& settings, Stores stores) = nullptr;
+        bool can_stream = false;
+    };
+    // Those that are not needed have no kernel; they are at the end.
     using Passes = std::array<Pass, 3>;
 
   private:
@@ -41,7 +44,7 @@ class RowConverter {
 
     const Passes& passes_;
     ConversionSettings settings_;
-    Destination destination_;
+    Stores stores_;
     std::size_t from_bytes_;
     std::size_t to_bytes_;
     alignas(64) std::array<Scratch, 2> scratch_;

@@ -8,7 +8,7 @@
 namespace zq {
 
 void copy_rows(ConstRows from, Rows to, std::size_t rows, std::size_t bytes) {
-    const bool streamed = destination_for(rows * bytes) == Destination::kStreamed;
+    const bool streamed = stores_for(rows * bytes) == Stores::kStreamed;
     for (std::size_t y = 0; y < rows; ++y) {
         const auto row = static_cast<std::ptrdiff_t>(y);
         const std::uint8_t* source = from.first + row * from.stride;

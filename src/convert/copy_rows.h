@@ -4,17 +4,16 @@
 #include <cstddef>
 #include <cstdint>
 
-namespace zq {
+#include "kernels/stores.h"
 
-// Whether a destination is written past the cache.
-enum class Destination { kCached, kStreamed };
+namespace zq {
 
 // Pictures larger than a core's share of the last cache: what is written first would be driven out
 // before anyone reads it, and writing past the cache saves fetching it beforehand.
 inline constexpr std::size_t kStreamedBytes = std::size_t{8} << 20;
 
-constexpr Destination destination_for(std::size_t bytes) {
-    return bytes >= kStreamedBytes ? Destination::kStreamed : Destination::kCached;
+constexpr Stores stores_for(std::size_t bytes) {
+    return bytes >= kStreamedBytes ? Stores::kStreamed : Stores::kCached;
 }
 
 // Rows of bytes, `stride` from one to the next.

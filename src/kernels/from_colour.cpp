@@ -65,11 +65,13 @@ void rgb_to_mean_f32(const std::uint32_t* from, float* to, std::size_t pixels) {
             [&](auto pixel) HWY_ATTR { return third(sum_of_rgb(pixel)); });
 }
 
-void rgb_to_rgbu64(const std::uint32_t* from, std::uint64_t* to, std::size_t pixels) {
+void rgb_to_rgbu64(const std::uint32_t* from, std::uint64_t* to, std::size_t pixels,
+                   Stores stores) {
     const hn::ScalableTag<std::uint16_t> tag;
-    map_row(hn::Rebind<std::uint8_t, decltype(tag)>(), tag,
-            reinterpret_cast<const std::uint8_t*>(from), reinterpret_cast<std::uint16_t*>(to),
-            4 * pixels, [&](auto channel) HWY_ATTR { return hn::PromoteTo(tag, channel); });
+    map_wide_row(hn::Rebind<std::uint8_t, decltype(tag)>(), tag,
+                 reinterpret_cast<const std::uint8_t*>(from), reinterpret_cast<std::uint16_t*>(to),
+                 4 * pixels, stores,
+                 [&](auto channel) HWY_ATTR { return hn::PromoteTo(tag, channel); });
 }
 
 void hsl_to_luminance(const std::uint32_t* from, std::uint8_t* to, std::size_t pixels) {
@@ -99,7 +101,7 @@ namespace zq {
 
 ZQ_EXPORT_ROW_KERNEL(rgb_to_mean_u8, std::uint32_t, std::uint8_t);
 ZQ_EXPORT_ROW_KERNEL(rgb_to_mean_f32, std::uint32_t, float);
-ZQ_EXPORT_ROW_KERNEL(rgb_to_rgbu64, std::uint32_t, std::uint64_t);
+ZQ_EXPORT_WIDE_ROW_KERNEL(rgb_to_rgbu64, std::uint32_t, std::uint64_t);
 ZQ_EXPORT_ROW_KERNEL(hsl_to_luminance, std::uint32_t, std::uint8_t);
 ZQ_EXPORT_ROW_KERNEL(rgbu64_to_mean_i16, std::uint64_t, std::int16_t);
 ZQ_EXPORT_ROW_KERNEL(rgbu64_to_mean_f32, std::uint64_t, float);

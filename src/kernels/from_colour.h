@@ -6,6 +6,8 @@
 #include <cstddef>
 #include <cstdint>
 
+#include "kernels/stores.h"
+
 namespace zq {
 
 // (blue + green + red) / 3, rounded down.
@@ -13,7 +15,7 @@ void rgb_to_mean_u8(const std::uint32_t* from, std::uint8_t* to, std::size_t pix
 // (blue + green + red) * (1 / 3.0) in double precision, rounded to the nearest float.
 void rgb_to_mean_f32(const std::uint32_t* from, float* to, std::size_t pixels);
 // Each byte in 16 bits.
-void rgb_to_rgbu64(const std::uint32_t* from, std::uint64_t* to, std::size_t pixels);
+void rgb_to_rgbu64(const std::uint32_t* from, std::uint64_t* to, std::size_t pixels, Stores stores);
 // The lowest byte.
 void hsl_to_luminance(const std::uint32_t* from, std::uint8_t* to, std::size_t pixels);
 

@@ -41,11 +41,12 @@ void u16_to_u8(const std::uint16_t* from, std::uint8_t* to, std::size_t samples,
             [&](auto sample) HWY_ATTR { return reduce(sample, reduction); });
 }
 
-void i16_to_f32(const std::int16_t* from, float* to, std::size_t pixels) {
+void i16_to_f32(const std::int16_t* from, float* to, std::size_t pixels, Stores stores) {
     const hn::ScalableTag<float> tag;
     const hn::RebindToSigned<decltype(tag)> words;
-    map_row(hn::Rebind<std::int16_t, decltype(tag)>(), tag, from, to, pixels,
-            [&](auto sample) HWY_ATTR { return hn::ConvertTo(tag, hn::PromoteTo(words, sample)); });
+    map_wide_row(hn::Rebind<std::int16_t, decltype(tag)>(), tag, from, to, pixels, stores,
+                 [&](auto sample)
+                     HWY_ATTR { return hn::ConvertTo(tag, hn::PromoteTo(words, sample)); });
 }
 
 void i16_to_u16(const std::int16_t* from, std::uint16_t* to, std::size_t pixels) {
@@ -56,14 +57,15 @@ void i16_to_u16(const std::int16_t* from, std::uint16_t* to, std::size_t pixels)
     });
 }
 
-void u16_to_grey64(const std::uint16_t* from, std::uint64_t* to, std::size_t pixels) {
+void u16_to_grey64(const std::uint16_t* from, std::uint64_t* to, std::size_t pixels,
+                   Stores stores) {
     const hn::ScalableTag<std::uint64_t> tag;
     const hn::Rebind<std::uint32_t, decltype(tag)> words;
-    map_row(hn::Rebind<std::uint16_t, decltype(tag)>(), tag, from, to, pixels,
-            [&](auto value) HWY_ATTR {
-                const auto blue = hn::PromoteTo(tag, hn::PromoteTo(words, value));
-                return hn::Or(hn::Or(blue, hn::ShiftLeft<16>(blue)), hn::ShiftLeft<32>(blue));
-            });
+    map_wide_row(hn::Rebind<std::uint16_t, decltype(tag)>(), tag, from, to, pixels, stores,
+                 [&](auto value) HWY_ATTR {
+                     const auto blue = hn::PromoteTo(tag, hn::PromoteTo(words, value));
+                     return hn::Or(hn::Or(blue, hn::ShiftLeft<16>(blue)), hn::ShiftLeft<32>(blue));
+                 });
 }
 
 }  // namespace zq::HWY_NAMESPACE
@@ -72,9 +74,9 @@ HWY_AFTER_NAMESPACE();
 #if HWY_ONCE
 namespace zq {
 
-ZQ_EXPORT_ROW_KERNEL(i16_to_f32, std::int16_t, float);
+ZQ_EXPORT_WIDE_ROW_KERNEL(i16_to_f32, std::int16_t, float);
 ZQ_EXPORT_ROW_KERNEL(i16_to_u16, std::int16_t, std::uint16_t);
-ZQ_EXPORT_ROW_KERNEL(u16_to_grey64, std::uint16_t, std::uint64_t);
+ZQ_EXPORT_WIDE_ROW_KERNEL(u16_to_grey64, std::uint16_t, std::uint64_t);
 
 HWY_EXPORT(i16_to_u8);
 HWY_EXPORT(u16_to_u8);

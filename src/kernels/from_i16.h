@@ -5,6 +5,8 @@
 #include <cstddef>
 #include <cstdint>
 
+#include "kernels/stores.h"
+
 namespace zq {
 
 // How samples of a bit depth become 8 bits: (sample + half) >> shift, rounding half up, and 255 for
@@ -17,13 +19,13 @@ struct Reduction {
 };
 
 void i16_to_u8(const std::int16_t* from, std::uint8_t* to, std::size_t pixels, Reduction reduction);
-void i16_to_f32(const std::int16_t* from, float* to, std::size_t pixels);
+void i16_to_f32(const std::int16_t* from, float* to, std::size_t pixels, Stores stores);
 // Negative samples as 0.
 void i16_to_u16(const std::int16_t* from, std::uint16_t* to, std::size_t pixels);
 
 void u16_to_u8(const std::uint16_t* from, std::uint8_t* to, std::size_t samples,
                Reduction reduction);
 // The value in the lower three 16-bit words, the highest 0: a grey RGBU64 pixel.
-void u16_to_grey64(const std::uint16_t* from, std::uint64_t* to, std::size_t pixels);
+void u16_to_grey64(const std::uint16_t* from, std::uint64_t* to, std::size_t pixels, Stores stores);
 
 }  // namespace zq

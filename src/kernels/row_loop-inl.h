@@ -11,7 +11,10 @@
 #include <hwy/highway.h>
 
 #include <cstddef>
+#include <cstdint>
 #include <cstring>
+
+#include "kernels/stores.h"
 
 HWY_BEFORE_NAMESPACE();
 namespace zq::HWY_NAMESPACE {
@@ -45,6 +48,30 @@ HWY_INLINE void map_row(FromTag from_tag, ToTag to_tag,
                        [&](const hn::TFromD<FromTag>* source, hn::TFromD<ToTag>* target) HWY_ATTR {
                            hn::StoreU(function(hn::LoadU(from_tag, source)), to_tag, target);
                        });
+}
+
+// map_row for targets of whole vectors, which may be written past the cache: all but the ends of
+// the row, as that wants aligned addresses.
+template <class FromTag, class ToTag, class Function>
+HWY_INLINE void map_wide_row(FromTag from_tag, ToTag to_tag,
+                             const hn::TFromD<FromTag>* HWY_RESTRICT from,
+                             hn::TFromD<ToTag>* HWY_RESTRICT to, std::size_t pixels, Stores stores,
+                             const Function& function) {
+    const std::size_t lanes = hn::Lanes(to_tag);
+    const bool aligned = reinterpret_cast<std::uintptr_t>(to) % sizeof(*to) == 0;
+    if (stores == Stores::kStreamed && aligned && pixels >= 2 * lanes) {
+        const std::size_t bytes = lanes * sizeof(*to);
+        const std::size_t head = (0 - reinterpret_cast<std::uintptr_t>(to)) % bytes / sizeof(*to);
+        map_row(from_tag, to_tag, from, to, head, function);
+        std::size_t done = head;
+        for (; done + lanes <= pixels; done += lanes) {
+            hn::Stream(function(hn::LoadU(from_tag, from + done)), to_tag, to + done);
+        }
+        from += done;
+        to += done;
+        pixels -= done;
+    }
+    map_row(from_tag, to_tag, from, to, pixels, function);
 }
 
 }  // namespace zq::HWY_NAMESPACE

@@ -289,7 +289,7 @@ void compare(Type from, Type to, std::int32_t depth, const Bytes& source) {
     }
     zqtest::on_every_simd_target([&] {
         Bytes actual(expected.size());
-        RowConverter(from, to, {.bit_depth = depth}, Destination::kCached)
+        RowConverter(from, to, {.bit_depth = depth}, Stores::kCached)
             .convert(source.data(), actual.data(), count);
         ASSERT_NO_FATAL_FAILURE(expect_equal(to, actual, expected, source));
     });
@@ -310,19 +310,22 @@ TEST(ConvertRows, EveryPairFollowsTheRules) {
     }
 }
 
-// Rows of every length around the vectors' and the passes', at odd addresses, written past the
-// cache or not.
+// Rows of every length around the vectors' and the passes', at odd addresses and at such as are
+// aligned for elements only, written past the cache or not.
 TEST(ConvertRows, StayInsideTheirRows) {
     static constexpr std::uint8_t kGuard = 0xA5;
     const Bytes noise = colours(2);
-    const auto converted = [&](Type from, Type to, std::size_t pixels, Destination kind) {
-        const Bytes source(noise.begin(),
-                           noise.begin() + static_cast<std::ptrdiff_t>(pixels * size_of(from) + 1));
-        Bytes target(pixels * size_of(to) + 129, kGuard);
-        RowConverter(from, to, {}, kind).convert(source.data() + 1, target.data() + 1, pixels);
-        const auto end = target.end() - 128;
-        EXPECT_EQ(target[0], kGuard);
-        EXPECT_EQ(std::count(end, target.end(), kGuard), 128) << pixels << " pixels";
+    const auto converted = [&](Type from, Type to, std::size_t pixels, std::size_t offset,
+                               Stores stores) {
+        const Bytes source(noise.begin(), noise.begin() + static_cast<std::ptrdiff_t>(
+                                                              pixels * size_of(from) + offset));
+        Bytes target(pixels * size_of(to) + offset + 128, kGuard);
+        RowConverter(from, to, {}, stores)
+            .convert(source.data() + offset, target.data() + offset, pixels);
+        const auto is_guard = [](std::uint8_t byte) { return byte == kGuard; };
+        EXPECT_TRUE(
+            std::all_of(target.begin(), target.begin() + static_cast<int>(offset), is_guard));
+        EXPECT_TRUE(std::all_of(target.end() - 128, target.end(), is_guard)) << pixels;
         return target;
     };
     zqtest::on_every_simd_target([&] {
@@ -330,10 +333,12 @@ TEST(ConvertRows, StayInsideTheirRows) {
             const auto from = static_cast<Type>(pair / 7), to = static_cast<Type>(pair % 7);
             if (from == to) continue;
             for (std::size_t pixels = 0; pixels < 70; ++pixels) {
-                converted(from, to, pixels, Destination::kCached);
-                ASSERT_EQ(converted(from, to, pixels + 480, Destination::kCached),
-                          converted(from, to, pixels + 480, Destination::kStreamed))
-                    << pair;
+                for (const std::size_t offset : {1, 8}) {
+                    converted(from, to, pixels, offset, Stores::kStreamed);
+                    ASSERT_EQ(converted(from, to, pixels + 480, offset, Stores::kCached),
+                              converted(from, to, pixels + 480, offset, Stores::kStreamed))
+                        << pair;
+                }
             }
         }
     });
