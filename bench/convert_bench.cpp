@@ -4,11 +4,13 @@
 #include <zqvissvc/convert.h>
 #include <zqvissvc/image.h>
 
-#include <functional>
+#include <initializer_list>
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "image.h"
+#include "refhost/refhost.h"
 #include "throughput.h"
 
 namespace {
@@ -32,7 +34,7 @@ Baseline opencv(const char* job) {
     return {"OpenCV", job == nullptr ? zqbench::Job() : zqbench::opencv_conversion(job)};
 }
 
-void convert(benchmark::State& state, const Conversion& conversion) {
+void Convert(benchmark::State& state, const Conversion& conversion) {
     const auto source = std::make_shared<Image>(conversion.from, kWidth, kHeight);
     const auto destination = std::make_shared<Image>(conversion.to, kWidth, kHeight);
     fill_with_noise(*source);
@@ -45,79 +47,71 @@ void convert(benchmark::State& state, const Conversion& conversion) {
                               check(DF_Convert(&from, &to, nullptr) == 0, "DF_Convert");
                           },
                           {zqbench::memcpy_of(bytes), opencv(conversion.opencv)});
+    state.SetLabel(std::string(kTypeNames[conversion.from]) + " to " + kTypeNames[conversion.to]);
+}
+
+// Pairs by their type codes.
+void ConvertPair(benchmark::State& state) {
+    Convert(state, {static_cast<int32_t>(state.range(0)), static_cast<int32_t>(state.range(1))});
 }
 
 // An array keeps its block, as that of a host that asks for every picture of a camera does.
-void to_array(benchmark::State& state, int32_t type) {
-    const auto image = std::make_shared<Image>(type, kWidth, kHeight);
-    fill_with_noise(*image);
+void ToArray(benchmark::State& state, int32_t type) {
+    const Image image(type, kWidth, kHeight);
+    fill_with_noise(image);
     ZqArray2dU8Handle u8 = nullptr;
     ZqArray2dI16Handle i16 = nullptr;
     ZqArray2dSglHandle sgl = nullptr;
     ZqArray2dU32Handle u32 = nullptr;
     ZqArray2dU64Handle u64 = nullptr;
     const auto job = [&] {
-        const ZqImageValue value = image->value();
+        const ZqImageValue value = image.value();
         check((type < ZQ_TYPE_COMPLEX
                    ? DF_ImageToArray(&value, nullptr, &u8, &i16, &sgl, nullptr)
                    : DF_ColorImageToArray_v2(&value, nullptr, &u32, &u64, nullptr)) == 0,
               "array");
     };
-    zqbench::run_compared(state, job, {zqbench::memcpy_of(2 * image->row_bytes() / kWidth)});
+    zqbench::run_compared(state, job, {zqbench::memcpy_of(2 * image.row_bytes() / kWidth)});
+    for (void* array : std::initializer_list<void*>{u8, i16, sgl, u32, u64})
+        refhost::dispose(array);
 }
 
-void add(const std::string& name, const std::function<void(benchmark::State&)>& run) {
-    benchmark::RegisterBenchmark(name.c_str(), run)
-        ->UseManualTime()
-        ->Unit(benchmark::kMillisecond)
-        ->Iterations(11);
+void timed(benchmark::internal::Benchmark* benchmark) {
+    benchmark->UseManualTime()->Unit(benchmark::kMillisecond)->Iterations(11);
 }
 
-const Conversion kCompared[] = {
-    {ZQ_TYPE_U8, ZQ_TYPE_I16, "U8 to I16"},
-    {ZQ_TYPE_U8, ZQ_TYPE_SGL, "U8 to SGL"},
-    {ZQ_TYPE_U8, ZQ_TYPE_RGB, "U8 to RGB"},
-    {ZQ_TYPE_U8, ZQ_TYPE_RGBU64},
-    {ZQ_TYPE_RGB, ZQ_TYPE_RGBU64, "RGB to RGBU64"},
-    {ZQ_TYPE_I16, ZQ_TYPE_U8, "I16 to U8"},
-    {ZQ_TYPE_I16, ZQ_TYPE_U8, "I16 of 12 bits to U8", 12},
-    {ZQ_TYPE_SGL, ZQ_TYPE_U8, "SGL to U8"},
-    {ZQ_TYPE_SGL, ZQ_TYPE_I16, "SGL to I16"},
-    {ZQ_TYPE_RGB, ZQ_TYPE_U8, "RGB to U8"},
-    {ZQ_TYPE_COMPLEX, ZQ_TYPE_SGL, "split and magnitude"},
-    {ZQ_TYPE_COMPLEX, ZQ_TYPE_U8, "split and magnitude"},
-    {ZQ_TYPE_COMPLEX, ZQ_TYPE_RGB, "split and magnitude"},
-};
-
-bool is_compared(int32_t from, int32_t to) {
-    for (const Conversion& c : kCompared) {
-        if (c.from == from && c.to == to) return true;
+void other_pairs(benchmark::internal::Benchmark* benchmark) {
+    // U8, I16, SGL, Complex, RGB, HSL, RGBU64 into those that have no line of their own below; RGB
+    // and HSL into each other are the colour models' own benchmark.
+    const std::vector<int64_t> targets[] = {
+        {0, 3, 5},    {1, 2, 3, 4, 5, 6}, {2, 3, 4, 5, 6},      {1, 3, 5, 6},
+        {1, 2, 3, 4}, {0, 1, 2, 3, 5, 6}, {0, 1, 2, 3, 4, 5, 6}};
+    for (int64_t from = 0; from < 7; ++from) {
+        for (const int64_t to : targets[from]) benchmark->Args({from, to});
     }
-    return false;
+    timed(benchmark);
 }
 
-void add_conversion(const Conversion& c) {
-    const std::string depth = c.bit_depth == 0 ? "" : "/" + std::to_string(c.bit_depth) + " bits";
-    add("Convert/" + std::string(kTypeNames[c.from]) + " to " + kTypeNames[c.to] + depth,
-        [c](benchmark::State& state) { convert(state, c); });
-}
-
-[[maybe_unused]] const bool g_registered = [] {
-    for (const Conversion& c : kCompared) add_conversion(c);
-    for (int32_t from = 0; from < 7; ++from) {
-        for (int32_t to = 0; to < 7; ++to) {
-            // RGB and HSL into each other are the colour models' own benchmark.
-            const bool colour_model = (from == ZQ_TYPE_RGB && to == ZQ_TYPE_HSL) ||
-                                      (from == ZQ_TYPE_HSL && to == ZQ_TYPE_RGB);
-            if (!is_compared(from, to) && !colour_model) add_conversion({from, to});
-        }
-    }
-    for (int32_t type = 0; type < 7; ++type) {
-        if (type == ZQ_TYPE_COMPLEX) continue;
-        add("ToArray/" + std::string(kTypeNames[type]),
-            [type](benchmark::State& state) { to_array(state, type); });
-    }
-    return true;
-}();
+using C = Conversion;
+BENCHMARK_CAPTURE(Convert, u8_to_i16, C{0, 1, "U8 to I16"})->Apply(timed);
+BENCHMARK_CAPTURE(Convert, u8_to_sgl, C{0, 2, "U8 to SGL"})->Apply(timed);
+BENCHMARK_CAPTURE(Convert, u8_to_rgb, C{0, 4, "U8 to RGB"})->Apply(timed);
+BENCHMARK_CAPTURE(Convert, u8_to_rgbu64, C{0, 6})->Apply(timed);
+BENCHMARK_CAPTURE(Convert, rgb_to_rgbu64, C{4, 6, "RGB to RGBU64"})->Apply(timed);
+BENCHMARK_CAPTURE(Convert, i16_to_u8, C{1, 0, "I16 to U8"})->Apply(timed);
+BENCHMARK_CAPTURE(Convert, i16_of_12_bits_to_u8, C{1, 0, "I16 of 12 bits to U8", 12})->Apply(timed);
+BENCHMARK_CAPTURE(Convert, sgl_to_u8, C{2, 0, "SGL to U8"})->Apply(timed);
+BENCHMARK_CAPTURE(Convert, sgl_to_i16, C{2, 1, "SGL to I16"})->Apply(timed);
+BENCHMARK_CAPTURE(Convert, rgb_to_u8, C{4, 0, "RGB to U8"})->Apply(timed);
+BENCHMARK_CAPTURE(Convert, complex_to_sgl, C{3, 2, "split and magnitude"})->Apply(timed);
+BENCHMARK_CAPTURE(Convert, complex_to_u8, C{3, 0, "split and magnitude"})->Apply(timed);
+BENCHMARK_CAPTURE(Convert, complex_to_rgb, C{3, 4, "split and magnitude"})->Apply(timed);
+BENCHMARK(ConvertPair)->Apply(other_pairs);
+BENCHMARK_CAPTURE(ToArray, u8, 0)->Apply(timed);
+BENCHMARK_CAPTURE(ToArray, i16, 1)->Apply(timed);
+BENCHMARK_CAPTURE(ToArray, sgl, 2)->Apply(timed);
+BENCHMARK_CAPTURE(ToArray, rgb, 4)->Apply(timed);
+BENCHMARK_CAPTURE(ToArray, hsl, 5)->Apply(timed);
+BENCHMARK_CAPTURE(ToArray, rgbu64, 6)->Apply(timed);
 
 }  // namespace

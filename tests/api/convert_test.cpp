@@ -35,7 +35,7 @@ class HostArray {
     }
     auto element(int32_t row, int32_t column) const {
         decltype(+(*handle)->elements[0]) value{};
-        const size_t index = static_cast<size_t>(row * (*handle)->columns + column);
+        const auto index = static_cast<size_t>(int64_t{row} * (*handle)->columns + column);
         std::memcpy(&value, reinterpret_cast<const char*>(*handle) + 8 + index * kBytes, kBytes);
         return value;
     }

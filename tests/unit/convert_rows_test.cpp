@@ -50,9 +50,8 @@ double clamped(double value, double lower, double upper) {
 
 // The grey value of a pixel as a number, for every type but RGBU64 on its way to 8 bits.
 double grey_of(Type type, const void* pixel) {
-    const auto mean = [](const auto& colour, bool whole) {
-        const int sum = colour.blue + colour.green + colour.red;
-        return whole ? sum / 3 : sum * 0.3333333333333333;
+    const auto mean = [](const auto& colour) {
+        return (colour.blue + colour.green + colour.red) * 0.3333333333333333;
     };
     switch (type) {
         case Type::kU8:
@@ -68,9 +67,9 @@ double grey_of(Type type, const void* pixel) {
             return std::sqrt(re * re + im * im);
         }
         case Type::kRgb:
-            return mean(*static_cast<const Rgb*>(pixel), false);
+            return mean(*static_cast<const Rgb*>(pixel));
         case Type::kRgbU64:
-            return mean(*static_cast<const RgbU64*>(pixel), false);
+            return mean(*static_cast<const RgbU64*>(pixel));
     }
     return 0;
 }
@@ -377,6 +376,21 @@ TEST(ConvertImage, TakesSizeAndBorderAndKeepsALentDestination) {
     EXPECT_EQ(colour.at<std::uint32_t>(32, 1), 0x070707U);
 }
 
+void exchange_quadrants(std::vector<std::uint32_t>& pixels, std::int32_t width,
+                        std::int32_t height) {
+    const auto at = [&](std::int32_t x, std::int32_t y) -> std::uint32_t& {
+        return pixels[static_cast<std::size_t>(y) * static_cast<std::size_t>(width) +
+                      static_cast<std::size_t>(x)];
+    };
+    const std::int32_t half_width = width / 2, half_height = height / 2;
+    for (std::int32_t y = 0; y < half_height; ++y) {
+        for (std::int32_t x = 0; x < half_width; ++x) {
+            std::swap(at(x, y), at(x + half_width, y + half_height));
+            std::swap(at(x + half_width, y), at(x, y + half_height));
+        }
+    }
+}
+
 TEST(ConvertImage, SpectrumIsScaledAndItsQuadrantsExchanged) {
     struct Case {
         std::int32_t width, height;
@@ -396,18 +410,7 @@ TEST(ConvertImage, SpectrumIsScaledAndItsQuadrantsExchanged) {
                 expected.push_back(shade * 0x10101U);
             }
         }
-        const std::int32_t half_width = width / 2, half_height = height / 2;
-        const auto exchange = [&](std::int32_t x, std::int32_t y, std::int32_t x2,
-                                  std::int32_t y2) {
-            std::swap(expected[static_cast<std::size_t>(y * width + x)],
-                      expected[static_cast<std::size_t>(y2 * width + x2)]);
-        };
-        for (std::int32_t y = 0; y < half_height; ++y) {
-            for (std::int32_t x = 0; x < half_width; ++x) {
-                exchange(x, y, x + half_width, y + half_height);
-                exchange(x + half_width, y, x, y + half_height);
-            }
-        }
+        exchange_quadrants(expected, width, height);
         convert_image(source.image, spectrum.image);
         for (std::size_t i = 0; i < expected.size(); ++i) {
             const auto index = static_cast<std::int32_t>(i);
