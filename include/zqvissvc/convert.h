@@ -17,12 +17,13 @@ ZQ_BEGIN_C
  *
  * Only the array of the image's type is written, the others are neither read nor changed and may be
  * null: rows x columns elements, one a pixel, the pixel's bytes as stored. It is the caller's; a
- * null handle is given a block. The forms _Bounded never resize it: they fail with
- * ZQ_ERR_OUTPUT_ARRAY_TOO_SMALL when its block has not enough room, and store only the counts and
- * the elements else.
+ * null handle is given a block. The forms _Bounded never resize it; they only store the counts and
+ * the elements in its block.
  *
  * Errors: ZQ_ERR_NOT_AN_IMAGE; ZQ_ERR_INVALID_IMAGE_TYPE for a type that the function has no array
- * for; ZQ_ERR_MEMORY for a null array (bounded: or a null handle); ZQ_ERR_NOT_ENOUGH_MEMORY. */
+ * for; ZQ_ERR_MEMORY for a null array (bounded: or a null handle); ZQ_ERR_OUTPUT_ARRAY_TOO_SMALL
+ * (bounded: its block has not enough room); ZQ_ERR_NOT_ENOUGH_MEMORY. The array of an RGB or HSL
+ * image is 0 x 0 after the last two, any other array what it was. */
 
 /* U8, I16 and SGL images. */
 ZQ_API ZqError ZQ_CALL DF_ImageToArray(const ZqImageValue* image, ZqArrayI32Handle rectangle,
@@ -56,19 +57,21 @@ ZQ_API ZqError ZQ_CALL DF_ColorImageToArray_Bounded_v2(const ZqImageValue* image
 
 /* Gives the destination the source's size, border size and picture, in the destination's own pixel
  * type; the border's pixels are copied when the types are the same, else undefined. The same image
- * twice changes nothing. A destination that means no image is looked for by its name; without an
- * image of that name and without an image word it becomes a further value of the source.
+ * twice changes nothing. A destination that means no image is looked for by its name, and means the
+ * image that is found from then on; without an image of that name, one without an image word becomes
+ * a further value of the source, one with a stale word is refused. Null is no destination: nothing
+ * happens then.
  *
  * Grey values go into luminance and into all three colours, colours become grey as their mean, and
  * alpha is 0 where the source has none. 16-bit samples become 8 bits by the source's bit depth
  * (DF_ImageBitDepth2), rounding half up, or clamped where none is set; other narrowing clamps and
  * cuts towards zero, NaN giving the lower bound. Complex pixels count by their magnitude; as RGB
  * they are shown as a spectrum: magnitude * 128 / (width * height), at most 255, the quadrants
- * exchanged so that the origin lies in the centre. RGB and HSL are converted by the colour model of
- * the toolkit's hue, saturation and luminance, in double precision; RGB (U64) by way of 8 bits.
+ * exchanged so that the origin lies in the centre. RGB becomes HSL by the toolkit's colour model in double
+ * precision, HSL becomes RGB by its fixed-point form; RGB (U64) becomes HSL by way of 8 bits.
  *
  * Errors: ZQ_ERR_NOT_AN_IMAGE, ZQ_ERR_IMAGE_LENT (the destination would have to change its size),
- * ZQ_ERR_NOT_ENOUGH_MEMORY; the destination then is as it was. */
+ * ZQ_ERR_NOT_ENOUGH_MEMORY, ZQ_ERR_POOL_EXHAUSTED; the destination then is as it was. */
 ZQ_API ZqError ZQ_CALL DF_Convert(const ZqImageValue* source, ZqImageValue* destination,
                                   ZqErrorCluster* error);
 

@@ -11,14 +11,9 @@ namespace {
 // Makes room for the converted picture; a failure leaves the destination as it was.
 void take_shape(const Image& source, Image& destination) {
     const Extent wanted = source.extent();
-    const std::int32_t old_border = destination.extent().border;
-    destination.set_border(wanted.border);
-    try {
-        destination.resize(wanted.width, wanted.height, std::nullopt, ResizeMode::kPlain);
-    } catch (...) {
-        destination.set_border(old_border);
-        throw;
-    }
+    destination.resize(wanted.width, wanted.height, wanted.border);
+    const bool same_samples = source.type() == destination.type();
+    destination.set_sample_offset(same_samples ? source.sample_offset() : 0);
 }
 
 std::size_t pixel_count(const Image& image) {

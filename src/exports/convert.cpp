@@ -75,17 +75,23 @@ ImageHandle find_destination(const ZqImageValue* destination) {
     return nullptr;
 }
 
+void make_further_value(const ZqImageValue* source, ImageHandle image, ZqImageValue* destination) {
+    const LockedImage locked(image);
+    host::copy_string(&destination->name, source == nullptr ? nullptr : source->name);
+    destination->image = image;
+}
+
 void convert_values(const ZqImageValue* source, ZqImageValue* destination) {
     const std::array<ImageHandle, 2> images = {host::require_image(source),
                                                find_destination(destination)};
     if (images[1] == nullptr) {
-        if (destination == nullptr) throw kNullPointer;
-        host::copy_string(&destination->name, source->name);
-        destination->image = images[0];
+        // No value means no image, as an empty one does, but cannot take the source's.
+        if (destination != nullptr) make_further_value(source, images[0], destination);
         return;
     }
     const ImageLock lock(images);
     convert_image(*Image::from_handle(images[0]), *Image::from_handle(images[1]));
+    if (destination != nullptr) destination->image = images[1];
 }
 
 }  // namespace

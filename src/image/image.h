@@ -71,6 +71,8 @@ class Image final : public Object {
     void reinitialise(const ImageShape& shape);
     void resize(std::int32_t width, std::int32_t height, std::optional<std::int32_t> new_type,
                 ResizeMode mode);
+    // resize in mode kPlain, and the border with it, in one step.
+    void resize(std::int32_t width, std::int32_t height, std::int32_t border);
     // Re-lays the buffer; the pixels of the image proper are kept, the border's are undefined.
     void set_border(std::int32_t border);
     // Makes the caller's buffer the image's pixels, the first byte being pixel (-border, -border).

@@ -91,6 +91,10 @@ void Image::resize(std::int32_t width, std::int32_t height, std::optional<std::i
     reshape(normalised(target_type, width, height, record_.border), mode);
 }
 
+void Image::resize(std::int32_t width, std::int32_t height, std::int32_t border) {
+    reshape(normalised(type(), width, height, border), ResizeMode::kPlain);
+}
+
 Layout Image::layout_for(const Extent& target) const {
     Layout layout = lay_out(target);
     if (is_greedy()) {

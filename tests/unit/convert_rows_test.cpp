@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <array>
 #include <bit>
 #include <cmath>
 #include <complex>
@@ -14,6 +15,7 @@
 #include <vector>
 
 #include "convert/convert_image.h"
+#include "image/memory.h"
 #include "kernels/colour_model.h"
 #include "support/simd_targets.h"
 #include "support/thoroughness.h"
@@ -309,6 +311,26 @@ TEST(ConvertRows, EveryPairFollowsTheRules) {
     }
 }
 
+TEST(ConvertRows, ScaledMagnitudesAreExact) {
+    const std::vector<float> parts = complex_numbers();
+    const Bytes source = bytes_of(parts);
+    for (const double pixels : {1.0, 3.0, 48.0, 640.0 * 480, 12'288'000.0}) {
+        const double scale = 128 / pixels;
+        std::vector<std::uint32_t> expected;
+        for (std::size_t i = 0; i < parts.size(); i += 2) {
+            const double value = grey_of(Type::kComplex, &parts[i]) * scale;
+            expected.push_back(static_cast<std::uint32_t>(clamped(value, 0, 255)) * 0x10101U);
+        }
+        zqtest::on_every_simd_target([&] {
+            Bytes actual(expected.size() * 4);
+            RowConverter(Type::kComplex, Type::kRgb, {.scale = scale}, Stores::kCached)
+                .convert(source.data(), actual.data(), expected.size());
+            ASSERT_NO_FATAL_FAILURE(expect_equal(Type::kRgb, actual, bytes_of(expected), source))
+                << "128 / " << pixels;
+        });
+    }
+}
+
 // Rows of every length around the vectors' and the passes', at odd addresses and at such as are
 // aligned for elements only, written past the cache or not.
 TEST(ConvertRows, StayInsideTheirRows) {
@@ -357,7 +379,7 @@ struct TestImage {
     Image image{Variant::kPrivate, {}};
 };
 
-TEST(ConvertImage, TakesSizeAndBorderAndKeepsALentDestination) {
+TEST(ConvertImage, TakesSizeAndBorderButNotIntoALentImage) {
     TestImage source(Type::kU8, 33, 2, 5), colour(Type::kRgb, 1, 9, 1), copy(Type::kU8, 0, 0);
     source.at<std::uint8_t>(32, 1) = 7;
     source.at<std::uint8_t>(-5, 6) = 9;
@@ -374,6 +396,56 @@ TEST(ConvertImage, TakesSizeAndBorderAndKeepsALentDestination) {
     EXPECT_THROW(convert_image(other.image, colour.image), GRLIBError_enum);
     EXPECT_EQ(colour.image.extent(), (Extent{Type::kRgb, 33, 2, 5}));
     EXPECT_EQ(colour.at<std::uint32_t>(32, 1), 0x070707U);
+}
+
+// A picture that there is no memory for leaves the destination as it was, the caller's own buffer
+// included.
+TEST(ConvertImage, FailureLeavesTheDestinationAlone) {
+    alignas(64) std::array<std::uint8_t, 8 * 24 * 24> buffer{};
+    TestImage source(Type::kU8, 17, 16), destination(Type::kComplex, 0, 0);
+    destination.image.wrap_external({3, 16, 16, 4}, buffer.data(), 0);
+    const std::uint8_t* const first = destination.image.record().firstPixel;
+    const memory::HostRoutine none = {[](std::size_t) -> void* { return nullptr; }, [](void*) {}};
+    memory::set_mode(memory::Mode::kHostRoutine, &none);
+    EXPECT_THROW(convert_image(source.image, destination.image), GRLIBError_enum);
+    memory::set_mode(memory::Mode::kHeap, nullptr);
+    EXPECT_EQ(destination.image.record().firstPixel, first);
+    EXPECT_EQ(destination.image.extent(), (Extent{Type::kComplex, 16, 16, 4}));
+}
+
+TEST(ConvertImage, SampleOffsetIsTheSourcesOrNone) {
+    TestImage samples(Type::kI16, 2, 2), copy(Type::kI16, 2, 2), floats(Type::kSgl, 2, 2);
+    samples.image.set_sample_offset(-5);
+    convert_image(samples.image, copy.image);
+    EXPECT_EQ(copy.image.sample_offset(), -5);
+    convert_image(floats.image, copy.image);
+    EXPECT_EQ(copy.image.sample_offset(), 0);
+}
+
+// Large enough to be written past the cache.
+TEST(ConvertImage, LargePicturesAreWholeToTheLastPixel) {
+    TestImage source(Type::kRgb, 2101, 1001, 2), copy(Type::kRgb, 0, 0), wide(Type::kRgbU64, 0, 0),
+        grey(Type::kSgl, 0, 0);
+    for (std::int32_t y = -2; y < 1003; ++y) {
+        for (std::int32_t x = -2; x < 2103; ++x) {
+            source.at<std::uint32_t>(x, y) = static_cast<std::uint32_t>(x * 4099 + y) & 0xFFFFFF;
+        }
+    }
+    for (TestImage* destination : {&copy, &wide, &grey}) {
+        convert_image(source.image, destination->image);
+    }
+    std::int64_t wrong = 0;
+    for (std::int32_t y = 0; y < 1001; ++y) {
+        for (std::int32_t x = 0; x < 2101; ++x) {
+            const Rgb pixel = source.at<Rgb>(x, y);
+            const RgbU64 wanted = to_rgbu64(Type::kRgb, &pixel, 0);
+            wrong += copy.at<std::uint32_t>(x, y) != source.at<std::uint32_t>(x, y);
+            wrong += std::memcmp(&wide.at<RgbU64>(x, y), &wanted, sizeof wanted) != 0;
+            wrong += grey.at<float>(x, y) != static_cast<float>(grey_of(Type::kRgb, &pixel));
+        }
+    }
+    EXPECT_EQ(wrong, 0);
+    EXPECT_EQ(copy.at<std::uint32_t>(2102, 1002), source.at<std::uint32_t>(2102, 1002));
 }
 
 void exchange_quadrants(std::vector<std::uint32_t>& pixels, std::int32_t width,
