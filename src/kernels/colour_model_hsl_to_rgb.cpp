@@ -64,7 +64,7 @@ HWY_INLINE hn::Vec<Pixels> rgb_of(hn::Vec<Pixels> hsl, hn::Vec<Pixels> slopes) {
 }
 
 // Up to kBlock pixels, a multiple of the vector. All slopes are looked up beforehand: gathering
-// them by vector took twice the time with AVX-512 on a Zen 5 processor.
+// them by vector took twice the time with AVX-512.
 HWY_INLINE void convert_hsl_block(const std::uint8_t* lsha, std::uint8_t* bgra,
                                   std::size_t pixels) {
     HWY_ALIGN std::uint32_t slopes[kBlock];

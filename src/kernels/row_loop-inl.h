@@ -8,6 +8,7 @@
 #define ZQ_KERNELS_ROW_LOOP_INL_H_
 #endif
 
+#include <hwy/cache_control.h>
 #include <hwy/highway.h>
 
 #include <cstddef>
@@ -63,8 +64,11 @@ HWY_INLINE void map_wide_row(FromTag from_tag, ToTag to_tag,
         const std::size_t bytes = lanes * sizeof(*to);
         const std::size_t head = (0 - reinterpret_cast<std::uintptr_t>(to)) % bytes / sizeof(*to);
         map_row(from_tag, to_tag, from, to, head, function);
+        // Streams hold up the processor's own fetching ahead, most of all across pages.
+        const std::size_t ahead = 1024 / sizeof(*from);
         std::size_t done = head;
         for (; done + lanes <= pixels; done += lanes) {
+            hwy::Prefetch(from + done + ahead);
             hn::Stream(function(hn::LoadU(from_tag, from + done)), to_tag, to + done);
         }
         from += done;
