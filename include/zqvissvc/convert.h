@@ -58,17 +58,18 @@ ZQ_API ZqError ZQ_CALL DF_ColorImageToArray_Bounded_v2(const ZqImageValue* image
 /* Gives the destination the source's size, border size and picture, in the destination's own pixel
  * type; the border's pixels are copied when the types are the same, else undefined. The same image
  * twice changes nothing. A destination that means no image is looked for by its name, and means the
- * image that is found from then on; without an image of that name, one without an image word becomes
- * a further value of the source, one with a stale word is refused. Null is no destination: nothing
- * happens then.
+ * image that is found from then on; without an image of that name, one without an image word
+ * becomes a further value of the source, one with a stale word is refused. Null is no destination:
+ * nothing happens then.
  *
  * Grey values go into luminance and into all three colours, colours become grey as their mean, and
  * alpha is 0 where the source has none. 16-bit samples become 8 bits by the source's bit depth
  * (DF_ImageBitDepth2), rounding half up, or clamped where none is set; other narrowing clamps and
  * cuts towards zero, NaN giving the lower bound. Complex pixels count by their magnitude; as RGB
  * they are shown as a spectrum: magnitude * 128 / (width * height), at most 255, the quadrants
- * exchanged so that the origin lies in the centre. RGB becomes HSL by the toolkit's colour model in double
- * precision, HSL becomes RGB by its fixed-point form; RGB (U64) becomes HSL by way of 8 bits.
+ * exchanged so that the origin lies in the centre. RGB becomes HSL by the toolkit's colour model in
+ * double precision, HSL becomes RGB by its fixed-point form; RGB (U64) becomes HSL by way of 8
+ * bits.
  *
  * Errors: ZQ_ERR_NOT_AN_IMAGE, ZQ_ERR_IMAGE_LENT (the destination would have to change its size),
  * ZQ_ERR_NOT_ENOUGH_MEMORY, ZQ_ERR_POOL_EXHAUSTED; the destination then is as it was. */
