@@ -120,10 +120,9 @@ ZQ_API ZqError ZQ_CALL ZqReadFile(ZqImageHandle image, const char* path, const Z
                                   ZqStringHandle* typeName, int32_t* pixelFormat,
                                   ZqArrayU32Handle* colourTable);
 
-/* Converts a picture into the type of `destination`, which gets the source's size and border. U8,
- * I16, RGB and RGB (U64) convert into each other, every type into itself; -1074396077 for other
- * pairs. An image converted into itself stays as it is. On failure the destination is what it
- * was. */
+/* Converts a picture into the type of `destination`, which gets the source's size and border; every
+ * pair of types by the rules of DF_Convert. An image converted into itself stays as it is. On
+ * failure the destination is what it was. */
 ZQ_API ZqError ZQ_CALL ZqConvertImage(ZqImageHandle source, ZqImageHandle destination);
 
 ZQ_END_C
