@@ -62,8 +62,12 @@ bool AttachmentList::remove(const ClassId& id) {
 }
 
 void AttachmentList::clear() {
-    while (head_.next != &head_) {
-        erase(static_cast<Node*>(head_.next));
+    Link* link = std::exchange(head_.next, &head_);
+    head_.previous = &head_;
+    head_.count = 0;
+    while (link != &head_) {
+        const std::unique_ptr<Node> owner(static_cast<Node*>(link));
+        link = link->next;
     }
 }
 
