@@ -61,6 +61,16 @@ typedef struct ZqArrayI32 {
 } ZqArrayI32;
 typedef ZqArrayI32** ZqArrayI32Handle;
 
+/* A one-dimensional host array of strings, which belong to the array; a null element is an empty
+ * string. Packed: the elements follow the count at once, as in every host array. */
+#pragma pack(push, 4)
+typedef struct ZqStringArray {
+    int32_t count;
+    ZqStringHandle elements[1];
+} ZqStringArray;
+#pragma pack(pop)
+typedef ZqStringArray** ZqStringArrayHandle;
+
 /* Two-dimensional host arrays: rows * columns elements, row by row. */
 typedef struct ZqArray2dU8 {
     int32_t rows, columns;
@@ -170,6 +180,7 @@ typedef struct ZqClassId {
 ZQ_ASSERT_OFFSET(ZqErrorCluster, status, 0);
 ZQ_ASSERT_OFFSET(ZqErrorCluster, code, 1);
 ZQ_ASSERT_OFFSET(ZqErrorCluster, source, 5);
+ZQ_ASSERT_OFFSET(ZqStringArray, elements, 4);
 ZQ_STATIC_ASSERT(sizeof(ZqMemoryRecord) == 16, "memory record changed");
 ZQ_STATIC_ASSERT(sizeof(ZqClassId) == 16, "class identifier changed");
 #if UINTPTR_MAX == 0xFFFFFFFFu

@@ -4,6 +4,7 @@
 
 #include "bayer.h"
 #include "convert.h"
+#include "custom_data.h"
 #include "errors.h"
 #include "files.h"
 #include "host.h"

@@ -42,6 +42,7 @@ enum class FunctionId : std::int32_t {
     kImageBitDepth = 40296,
     kFlattenImageOptions = 40351,
     kRemoteDisplayOptions = 40352,
+    kEnumerateCustomKeys = 40380,
 };
 
 }  // namespace zq::host

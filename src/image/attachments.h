@@ -39,6 +39,10 @@ class AttachmentList {
     // False when absent.
     bool remove(const ClassId& id);
     void clear();
+    // Whoever changes what an attachment holds says so here; whoever keeps something made from the
+    // attachments sees by the count that it is out of date.
+    void note_change() noexcept { ++change_count_; }
+    std::uint64_t change_count() const { return change_count_; }
     // What `image->customData` points at.
     void* head() { return &head_; }
 
@@ -56,6 +60,7 @@ class AttachmentList {
     Node* find_node(const ClassId& id) const;
     void erase(Node* node);
     Head head_;
+    std::uint64_t change_count_ = 0;
 };
 
 }  // namespace zq

@@ -13,6 +13,9 @@ inline bool same_class(const ClassId& a, const ClassId& b) {
     return std::memcmp(&a, &b, sizeof(ClassId)) == 0;
 }
 
+inline constexpr ClassId kCustomDataAttachment = {
+    0xE5457396, 0x3480, 0x4DD0, {0x9C, 0xEA, 0x77, 0xB1, 0x79, 0x14, 0xEC, 0x41}};
+
 // Two attachments that describe an image's geometry; a new size makes them void.
 inline constexpr ClassId kGeometryAttachment1 = {
     0x0AAFCF76, 0x8F2F, 0x4044, {0x64, 0xB9, 0xE1, 0x34, 0xE5, 0xC8, 0xE1, 0x34}};

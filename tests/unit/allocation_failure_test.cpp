@@ -1,6 +1,7 @@
 // Every allocation on the way to an image, or to another shape of it, fails once: nothing may be
 // left behind, and what was there stays as it was.
 #include <gtest/gtest.h>
+#include <zqvissvc/custom_data.h>
 #include <zqvissvc/image.h>
 
 #include <cstdint>
@@ -11,6 +12,7 @@
 #include <new>
 #include <string>
 #include <tuple>
+#include <utility>
 #include <vector>
 
 #include "host/boundary.h"
@@ -19,6 +21,7 @@
 #include "image/memory.h"
 #include "image/registry.h"
 #include "refhost/refhost.h"
+#include "serialize/custom_data.h"
 #include "tests/support/image_probes.h"
 
 namespace {
@@ -125,7 +128,13 @@ class AllocationFailureTest : public testing::Test {
         return std::tuple(Registry::instance().live_count(), live_buffers,
                           refhost::cookies().size(), refhost::cleanup_procs(),
                           refhost::live_handles(), std::string(bytes, sizeof *target),
-                          zqtest::pixels_of(image()), image().external_count());
+                          zqtest::pixels_of(image()), image().external_count(), custom_data());
+    }
+
+    // One empty store is not the same as none.
+    std::vector<std::uint8_t> custom_data() {
+        const CustomData* store = CustomData::find(image());
+        return store == nullptr ? std::vector<std::uint8_t>() : serialise(*store);
     }
 
     // Runs the operation with its first, second, ... allocation failing until none is left to fail;
@@ -230,6 +239,59 @@ TEST_F(AllocationFailureTest, HostImagesLeaveNothingWithTheHost) {
             1);
         EXPECT_EQ(value.name, nullptr);
     }
+}
+
+TEST_F(AllocationFailureTest, CustomDataStaysWithImageAndHost) {
+    const ZqImageValue value = {nullptr, target};
+    const std::string text(100, 't');
+    const std::string first_key(50, 'k');
+    const auto write = [&](const std::string& key, uint32_t bytes) {
+        return DF_WriteCustomData(&value, key.c_str(), text.data(), bytes, nullptr);
+    };
+    const auto remove = [&](const std::string& key) {
+        DF_RemoveCustomData(&value, key.c_str(), nullptr);
+    };
+    check(
+        "first entry", [&] { return write(first_key, 100); }, [&] { remove(first_key); });
+    ASSERT_EQ(write(first_key, 100), 0);
+    check(
+        "further entry", [&] { return write("second", 99); }, [&] { remove("second"); });
+    check(
+        "another value", [&] { return write(first_key, 50); }, [&] { write(first_key, 100); });
+    ZqHandle block = nullptr;
+    check(
+        "read",
+        [&] { return DF_ReadCustomData(&value, first_key.c_str(), &block, nullptr, nullptr); },
+        [&] { refhost::dispose(std::exchange(block, nullptr)); });
+    ASSERT_EQ(write("second", 99), 0);
+    ZqStringArrayHandle keys = nullptr;
+    const auto dispose_keys = [&] {
+        for (int i = 0; i < (*keys)->count; ++i) refhost::dispose((*keys)->elements[i]);
+        refhost::dispose(std::exchange(keys, nullptr));
+    };
+    const auto list = [&] { return DF_EnumerateCustomKeys(&value, &keys, nullptr); };
+    check("keys", list, dispose_keys);
+    EXPECT_EQ(keys, nullptr);
+    // Into an array that has other strings already.
+    ASSERT_EQ(list(), 0);
+    remove("second");
+    ZqStringHandle held = (*keys)->elements[1];
+    check(
+        "fewer keys",
+        [&] {
+            const std::int32_t code = list();
+            if (code != 0) {
+                EXPECT_EQ(std::pair((*keys)->count, (*keys)->elements[1]), std::pair(2, held));
+            }
+            return code;
+        },
+        [&] {
+            write("second", 99);
+            list();
+            remove("second");
+            held = (*keys)->elements[1];
+        });
+    dispose_keys();
 }
 
 TEST_F(AllocationFailureTest, OtherRequestsLeaveTheImage) {

@@ -21,7 +21,8 @@ namespace zq::host {
 namespace {
 
 // Counts and CRC-32 of the lines "number text\n", in order, number being the code of a message and
-// the id of any other text. The expected values were taken from the published tables.
+// the id of any other text. The expected values were taken from the published tables; ids from
+// 40380 to 49999 are texts of the library's own.
 TEST(ErrorTableTest, HoldsEveryPublishedText) {
     struct Case {
         unsigned first, last;
@@ -30,7 +31,7 @@ TEST(ErrorTableTest, HoldsEveryPublishedText) {
         unsigned long checksum;
     };
     const Case cases[] = {
-        {1, 49999, 0, 50, 0x8e14be5aUL},
+        {1, 40379, 0, 50, 0x8e14be5aUL},
         {50000, 65535, -1074446161, 544, 0x0cd8c4deUL},
     };
     for (const Case& c : cases) {
