@@ -281,7 +281,8 @@ TEST_F(AllocationFailureTest, CustomDataStaysWithImageAndHost) {
         [&] {
             const std::int32_t code = list();
             if (code != 0) {
-                EXPECT_EQ(std::pair((*keys)->count, (*keys)->elements[1]), std::pair(2, held));
+                EXPECT_EQ((*keys)->count, 2);
+                EXPECT_TRUE((*keys)->elements[1] == held);
             }
             return code;
         },
