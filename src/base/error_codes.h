@@ -38,6 +38,7 @@ enum GRLIBError_enum : std::int32_t {
     kUnableToWriteData = -1074395988,
     kDiskFull = -1074395983,
     kPaletteSize = -1074395976,
+    kInitializationError = -1074395960,
     kBitDepth = -1074395721,
     kValueNotInEnumeration = -1074395713,
     kNullPointer = -1074395269,
