@@ -91,7 +91,7 @@ void feed(jpeg_compress_struct& jpeg, const PixelTile& tile, AlphaBits* alpha) {
 }
 
 void put_tile(Bytes& out, const PixelTile& tile, int quality, AlphaBits* alpha) {
-    const JpegSteps luma = luma_steps(quality);
+    const JpegSteps luma = alpha != nullptr ? luma_steps(quality) : grey_steps(quality);
     const JpegSteps chroma = chroma_steps(quality);
     JpegSink sink(static_cast<std::size_t>(tile.width) * static_cast<std::size_t>(tile.height) / 4);
     JpegCompressor session;

@@ -156,8 +156,7 @@ void put_planes_of(Bytes& out, const Image& image, int quality) {
     }
     for (std::size_t i = 0; i < layout.planes; ++i) {
         const bool is_colour = i > 0 && !layout.is_float;
-        plan.steps[i] = wavelet_steps(quality, static_cast<int>(i), is_colour,
-                                      finest_step(plan.ranges[i], layout));
+        plan.steps[i] = wavelet_steps(quality, is_colour, finest_step(plan.ranges[i], layout));
         for (const std::int8_t step : plan.steps[i]) out.push_back(static_cast<std::uint8_t>(step));
     }
     put_lossless(out, image);

@@ -11,7 +11,8 @@ namespace zq {
 
 using JpegSteps = std::array<unsigned, 64>;  // row by row
 
-JpegSteps luma_steps(int quality);
+JpegSteps grey_steps(int quality);  // U8
+JpegSteps luma_steps(int quality);  // RGB, as are chroma_steps
 JpegSteps chroma_steps(int quality);
 
 // Steps of wavelet coefficients as exponents of two, where the samples span 2^kNominalBits.
@@ -20,8 +21,8 @@ inline constexpr int kFinestStep = -1;
 inline constexpr int kCoarsestStep = 16;
 using WaveletSteps = std::array<std::int8_t, kBands>;
 
-// Of plane 0, 1, 2 of an image; never finer than 2^finest. Planes that hold colour rather than
-// brightness are coded twice as coarsely.
-WaveletSteps wavelet_steps(int quality, int plane, bool is_colour, int finest);
+// Never finer than 2^finest. Planes that hold colour rather than brightness are coded more
+// coarsely.
+WaveletSteps wavelet_steps(int quality, bool is_colour, int finest);
 
 }  // namespace zq
