@@ -34,7 +34,7 @@ void paint(const zq::Image& image) {
             const int edge = (x / 37 + y / 53) % 7 == 0 ? 30 : 0;
             for (int i = 0; i < bytes; ++i) {
                 random = random * 1664525U + 1013904223U;
-                const double sample = shade + edge + i * 5 + (random >> 29);
+                const double sample = shade + edge + i * 5 + (random >> 28);
                 *at++ = static_cast<std::uint8_t>(i == 3 ? 0 : sample);
             }
         }
@@ -76,8 +76,8 @@ std::size_t bare_encode(const zq::Image& image, const std::vector<std::uint8_t>&
     copy_tables(block, jpeg);
     jpeg_start_compress(&jpeg, TRUE);
     while (jpeg.next_scanline < jpeg.image_height) {
-        JSAMPROW rows[16];
-        const JDIMENSION count = std::min<JDIMENSION>(16, jpeg.image_height - jpeg.next_scanline);
+        JSAMPROW rows[8];
+        const JDIMENSION count = std::min<JDIMENSION>(8, jpeg.image_height - jpeg.next_scanline);
         for (JDIMENSION i = 0; i < count; ++i) {
             rows[i] = image.row(static_cast<std::int32_t>(jpeg.next_scanline + i));
         }

@@ -4,9 +4,13 @@
 #include <algorithm>
 #include <array>
 #include <cstring>
+#include <memory>
 
 #include "codecs/jpeg_memory.h"
 #include "codecs/jpeg_session.h"
+#include "convert/copy_rows.h"
+#include "kernels/alpha_rows.h"
+#include "kernels/stream_copy.h"
 #include "serialize/quality_lossless.h"
 #include "serialize/quality_steps.h"
 
@@ -16,7 +20,7 @@ namespace {
 
 // JPEG ends at 65500; whole blocks of 8.
 constexpr std::int32_t kJpegSide = 65280;
-constexpr JDIMENSION kRowsAtOnce = 16;
+constexpr JDIMENSION kRowsAtOnce = 8;
 
 struct PixelTile {
     std::uint8_t* first;
@@ -42,26 +46,9 @@ bool is_one_tile(const Image& image) {
     return image.record().width <= kJpegSide && image.record().height <= kJpegSide;
 }
 
-// What all alpha bytes seen so far have in common.
-struct AlphaBits {
-    std::uint32_t all = 0xFFFFFFFF;
-    std::uint32_t any = 0;
-
-    void see(const std::uint8_t* row, std::int32_t width) {
-        std::uint32_t row_all = all;
-        std::uint32_t row_any = any;
-        for (std::ptrdiff_t x = 0; x < width; ++x) {
-            std::uint32_t pixel;
-            std::memcpy(&pixel, row + 4 * x, sizeof(pixel));
-            row_all &= pixel;
-            row_any |= pixel;
-        }
-        all = row_all;
-        any = row_any;
-    }
-    bool is_constant() const { return all >> 24 == any >> 24; }
-    std::uint8_t value() const { return static_cast<std::uint8_t>(any >> 24); }
-};
+bool is_alpha_constant(const CommonBits& bits) {
+    return bits.all >> 24 == bits.any >> 24;
+}
 
 void configure(jpeg_compress_struct& jpeg, bool colour, const JpegSteps& luma,
                const JpegSteps& chroma) {
@@ -78,20 +65,23 @@ void configure(jpeg_compress_struct& jpeg, bool colour, const JpegSteps& luma,
     if (colour) jpeg_add_quant_table(&jpeg, 1, chroma.data(), 100, TRUE);
 }
 
-void feed(jpeg_compress_struct& jpeg, const PixelTile& tile, AlphaBits* alpha) {
+void feed(jpeg_compress_struct& jpeg, const PixelTile& tile, CommonBits* bits) {
     std::array<JSAMPROW, kRowsAtOnce> rows;
     while (jpeg.next_scanline < jpeg.image_height) {
         const JDIMENSION count = std::min(kRowsAtOnce, jpeg.image_height - jpeg.next_scanline);
         for (JDIMENSION i = 0; i < count; ++i) {
             rows[i] = tile.first + (jpeg.next_scanline + i) * tile.stride;
-            if (alpha != nullptr) alpha->see(rows[i], tile.width);
+            if (bits != nullptr) {
+                gather_bits(reinterpret_cast<const std::uint32_t*>(rows[i]),
+                            static_cast<std::size_t>(tile.width), *bits);
+            }
         }
         jpeg_write_scanlines(&jpeg, rows.data(), count);
     }
 }
 
-void put_tile(Bytes& out, const PixelTile& tile, int quality, AlphaBits* alpha) {
-    const JpegSteps luma = alpha != nullptr ? luma_steps(quality) : grey_steps(quality);
+void put_tile(Bytes& out, const PixelTile& tile, int quality, CommonBits* bits) {
+    const JpegSteps luma = bits != nullptr ? luma_steps(quality) : grey_steps(quality);
     const JpegSteps chroma = chroma_steps(quality);
     JpegSink sink(static_cast<std::size_t>(tile.width) * static_cast<std::size_t>(tile.height) / 4);
     JpegCompressor session;
@@ -100,9 +90,9 @@ void put_tile(Bytes& out, const PixelTile& tile, int quality, AlphaBits* alpha) 
     session.run(kSystemError, [&] {
         jpeg.image_width = static_cast<JDIMENSION>(tile.width);
         jpeg.image_height = static_cast<JDIMENSION>(tile.height);
-        configure(jpeg, alpha != nullptr, luma, chroma);
+        configure(jpeg, bits != nullptr, luma, chroma);
         jpeg_start_compress(&jpeg, TRUE);
-        feed(jpeg, tile, alpha);
+        feed(jpeg, tile, bits);
         jpeg_finish_compress(&jpeg);
     });
     const OpenSection section(out);
@@ -147,57 +137,69 @@ void start(jpeg_decompress_struct& jpeg, const PixelTile& tile, bool colour) {
     jpeg_start_decompress(&jpeg);
 }
 
-// What is written into the fourth byte of each pixel of a tile.
-struct AlphaSource {
-    const LosslessPlane* plane = nullptr;  // null for types without one
+// One row of RGB on its way from libjpeg to the image, where it gets its alpha. Rows that lie at a
+// multiple of 32 bytes are written past the cache by libjpeg and would have to be fetched again;
+// this one does not.
+class AlphaRow {
+  public:
+    AlphaRow(const LosslessPlane& plane, std::int32_t width, Stores stores)
+        : plane_(plane),
+          stores_(stores),
+          memory_(std::make_unique_for_overwrite<std::uint32_t[]>(static_cast<std::size_t>(width) +
+                                                                  kAlignment)) {
+        const auto address =
+            reinterpret_cast<std::uintptr_t>(memory_.get()) / sizeof(std::uint32_t);
+        row_ = memory_.get() + (address % kAlignment == 0 ? 1 : 0);
+    }
 
-    void apply(std::uint8_t* row, const PixelTile& tile, JDIMENSION y) const {
-        if (plane == nullptr) return;
-        if (plane->planes == nullptr) {
-            set(row, tile.width);
+    JSAMPROW row() const { return reinterpret_cast<JSAMPROW>(row_); }
+    // The tile's row y, as it lies in row().
+    void deliver(const PixelTile& tile, JDIMENSION y) const {
+        const auto width = static_cast<std::size_t>(tile.width);
+        std::uint8_t* to = tile.first + y * tile.stride;
+        if (plane_.planes == nullptr) {
+            copy_with_alpha(row_, reinterpret_cast<std::uint32_t*>(to), width,
+                            static_cast<std::uint8_t>(plane_.value), stores_);
             return;
         }
         const std::uint8_t* alpha =
-            plane->planes->row(0, static_cast<std::size_t>(tile.y) + y) + tile.x;
-        for (std::ptrdiff_t x = 0; x < tile.width; ++x) row[4 * x + 3] = alpha[x];
+            plane_.planes->row(0, static_cast<std::size_t>(tile.y) + y) + tile.x;
+        for (std::size_t x = 0; x < width; ++x) row()[4 * x + 3] = alpha[x];
+        std::memcpy(to, row_, 4 * width);
     }
 
   private:
-    // Whole pixels at a time: vectors do that faster than every fourth byte.
-    void set(std::uint8_t* row, std::int32_t width) const {
-        const std::uint32_t alpha = std::uint32_t{plane->value} << 24;
-        for (std::ptrdiff_t x = 0; x < width; ++x) {
-            std::uint32_t pixel;
-            std::memcpy(&pixel, row + 4 * x, sizeof(pixel));
-            pixel = (pixel & 0x00FFFFFFU) | alpha;
-            std::memcpy(row + 4 * x, &pixel, sizeof(pixel));
-        }
-    }
+    static constexpr std::size_t kAlignment = 8;  // pixels
+
+    const LosslessPlane& plane_;
+    Stores stores_;
+    std::unique_ptr<std::uint32_t[]> memory_;
+    std::uint32_t* row_;
 };
 
-void read_tile(std::span<const std::uint8_t> bytes, const PixelTile& tile, bool colour,
-               const AlphaSource& alpha) {
+// `between` is null for types without alpha, whose rows go straight to the tile.
+void read_tile(std::span<const std::uint8_t> bytes, const PixelTile& tile,
+               const AlphaRow* between) {
     JpegSource source(bytes);
     JpegDecompressor session;
     jpeg_decompress_struct& jpeg = session.jpeg();
     source.attach(jpeg);
     session.run(kInitializationError, [&] {
-        start(jpeg, tile, colour);
+        start(jpeg, tile, between != nullptr);
         while (jpeg.output_scanline < jpeg.output_height) {
             const JDIMENSION y = jpeg.output_scanline;
-            JSAMPROW row = tile.first + y * tile.stride;
+            JSAMPROW row = between != nullptr ? between->row() : tile.first + y * tile.stride;
             jpeg_read_scanlines(&jpeg, &row, 1);
-            alpha.apply(row, tile, y);
+            if (between != nullptr) between->deliver(tile, y);
         }
     });
 }
 
 void read_tiles(std::span<const std::span<const std::uint8_t>> streams, const Image& target,
-                const AlphaSource& alpha) {
-    const bool colour = target.type() == PixelType::kRgb;
+                const AlphaRow* between) {
     std::size_t next = 0;
     for_each_tile(target,
-                  [&](const PixelTile& tile) { read_tile(streams[next++], tile, colour, alpha); });
+                  [&](const PixelTile& tile) { read_tile(streams[next++], tile, between); });
 }
 
 void copy_pixels(const Image& source, const Image& target) {
@@ -212,13 +214,13 @@ void copy_pixels(const Image& source, const Image& target) {
 
 void put_jpeg(Bytes& out, const Image& image, int quality) {
     const bool colour = image.type() == PixelType::kRgb;
-    AlphaBits alpha;
+    CommonBits bits;
     for_each_tile(image, [&](const PixelTile& tile) {
-        put_tile(out, tile, quality, colour ? &alpha : nullptr);
+        put_tile(out, tile, quality, colour ? &bits : nullptr);
     });
     if (!colour) return;
-    if (alpha.is_constant()) {
-        put_constant(out, alpha.value());
+    if (is_alpha_constant(bits)) {
+        put_constant(out, static_cast<std::uint16_t>(bits.any >> 24));
     } else {
         put_alpha(out, image);
     }
@@ -231,21 +233,24 @@ void read_jpeg(StreamReader& reader, Image& image) {
     std::vector<std::span<const std::uint8_t>> streams;
     for_each_tile(image, [&](const PixelTile&) { streams.push_back(reader.section()); });
     LosslessPlane plane;
-    AlphaSource alpha;
+    std::unique_ptr<AlphaRow> between;
     if (image.type() == PixelType::kRgb) {
-        plane = read_lossless(reader, static_cast<std::size_t>(record.width),
-                              static_cast<std::size_t>(record.height), 1);
-        alpha.plane = &plane;
+        const auto width = static_cast<std::size_t>(record.width);
+        const auto height = static_cast<std::size_t>(record.height);
+        plane = read_lossless(reader, width, height, 1);
+        between = std::make_unique<AlphaRow>(plane, record.width, stores_for(4 * width * height));
     }
     reader.expect_end();
     if (is_one_tile(image)) {
-        read_tiles(streams, image, alpha);
+        read_tiles(streams, image, between.get());
+        finish_streaming();
         return;
     }
     Image scratch(Variant::kPrivate, {});
     scratch.reinitialise(
         {.type = record.type, .width = record.width, .height = record.height, .border = 0});
-    read_tiles(streams, scratch, alpha);
+    read_tiles(streams, scratch, between.get());
+    finish_streaming();
     copy_pixels(scratch, image);
 }
 
