@@ -65,18 +65,19 @@ void configure(jpeg_compress_struct& jpeg, bool colour, const JpegSteps& luma,
     if (colour) jpeg_add_quant_table(&jpeg, 1, chroma.data(), 100, TRUE);
 }
 
+// Alpha is looked at when libjpeg has brought the rows into the cache.
 void feed(jpeg_compress_struct& jpeg, const PixelTile& tile, CommonBits* bits) {
     std::array<JSAMPROW, kRowsAtOnce> rows;
     while (jpeg.next_scanline < jpeg.image_height) {
         const JDIMENSION count = std::min(kRowsAtOnce, jpeg.image_height - jpeg.next_scanline);
         for (JDIMENSION i = 0; i < count; ++i) {
             rows[i] = tile.first + (jpeg.next_scanline + i) * tile.stride;
-            if (bits != nullptr) {
-                gather_bits(reinterpret_cast<const std::uint32_t*>(rows[i]),
-                            static_cast<std::size_t>(tile.width), *bits);
-            }
         }
         jpeg_write_scanlines(&jpeg, rows.data(), count);
+        for (JDIMENSION i = 0; bits != nullptr && i < count; ++i) {
+            gather_bits(reinterpret_cast<const std::uint32_t*>(rows[i]),
+                        static_cast<std::size_t>(tile.width), *bits);
+        }
     }
 }
 

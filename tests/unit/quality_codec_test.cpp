@@ -283,7 +283,8 @@ TEST(QualityCodecTest, AlphaIsExact) {
             };
             for (int i = 0; i < 37 * 21; ++i) {
                 std::memset(alpha(*image, i), constant ? 0xA7 : 1 + i * 5, 1);
-                if (bytes == 2) alpha(*image, i)[1] = constant ? 3 : static_cast<uint8_t>(i / 3);
+                if (bytes == 2)
+                    alpha(*image, i)[1] = static_cast<std::uint8_t>(constant ? 3 : i / 3);
             }
             const auto back = round_trip(*image, 20);
             for (int i = 0; i < 37 * 21; ++i) {
