@@ -23,20 +23,41 @@ constexpr std::int32_t kHeight = 3000;
 constexpr int kQuality = 75;
 constexpr std::size_t kHeader = 28;  // of the block, and the length of its first JPEG stream
 
+template <class Sample>
+void paint_row(std::uint8_t* row, std::int32_t y, int channels, double scale,
+               std::uint32_t& random) {
+    auto* at = reinterpret_cast<Sample*>(row);
+    for (std::int32_t x = 0; x < kWidth; ++x) {
+        const double shade = 110 + 50 * std::sin(x * 0.02) + 40 * std::cos(y * 0.03 + x * 0.01);
+        const int edge = (x / 37 + y / 53) % 7 == 0 ? 30 : 0;
+        for (int i = 0; i < channels; ++i) {
+            random = random * 1664525U + 1013904223U;
+            const double sample = shade + edge + i * 5 + (random >> 28);
+            *at++ = static_cast<Sample>(i == 3 ? 0 : scale * sample);
+        }
+    }
+}
+
 // Like a photograph: soft shapes, edges and the noise of a sensor.
 void paint(const zq::Image& image) {
     std::uint32_t random = 1;
-    const auto bytes = zq::bytes_per_pixel(image.type());
     for (std::int32_t y = 0; y < kHeight; ++y) {
-        std::uint8_t* at = image.row(y);
-        for (std::int32_t x = 0; x < kWidth; ++x) {
-            const double shade = 110 + 50 * std::sin(x * 0.02) + 40 * std::cos(y * 0.03 + x * 0.01);
-            const int edge = (x / 37 + y / 53) % 7 == 0 ? 30 : 0;
-            for (int i = 0; i < bytes; ++i) {
-                random = random * 1664525U + 1013904223U;
-                const double sample = shade + edge + i * 5 + (random >> 28);
-                *at++ = static_cast<std::uint8_t>(i == 3 ? 0 : sample);
-            }
+        std::uint8_t* row = image.row(y);
+        switch (image.type()) {
+            case zq::PixelType::kI16:
+                paint_row<std::int16_t>(row, y, 1, 100, random);
+                break;
+            case zq::PixelType::kSgl:
+                paint_row<float>(row, y, 1, 1e-3, random);
+                break;
+            case zq::PixelType::kComplex:
+                paint_row<float>(row, y, 2, 1e-3, random);
+                break;
+            case zq::PixelType::kRgbU64:
+                paint_row<std::uint16_t>(row, y, 4, 200, random);
+                break;
+            default:
+                paint_row<std::uint8_t>(row, y, zq::bytes_per_pixel(image.type()), 1, random);
         }
     }
 }
