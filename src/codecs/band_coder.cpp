@@ -9,10 +9,14 @@ namespace zq {
 
 namespace {
 
-// Nearest; halves away from zero. The casts are defined: magnitudes stay below 2^kMostBits.
+constexpr float kMostMagnitude = (1 << kMostBits) - 1;
+
+// Nearest; halves away from zero.
 void quantise(const float* coefficients, float inverse, std::size_t count, std::int32_t* out) {
     for (std::size_t x = 0; x < count; ++x) {
-        const float scaled = coefficients[x] * inverse;
+        float scaled = coefficients[x] * inverse;
+        scaled = scaled < -kMostMagnitude ? -kMostMagnitude : scaled;
+        scaled = scaled > kMostMagnitude ? kMostMagnitude : scaled;
         out[x] = static_cast<std::int32_t>(scaled + std::copysign(0.5F, scaled));
     }
 }

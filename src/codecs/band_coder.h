@@ -11,8 +11,8 @@
 
 namespace zq {
 
-// Quantised magnitudes stay below 2^kMostBits.
-inline constexpr int kMostBits = 24;
+// Quantised magnitudes stay below 2^kMostBits: so far single precision knows halves.
+inline constexpr int kMostBits = 23;
 
 // What was learnt about the coefficients so far. One for all bands of a plane of a tile.
 class BandCoder {

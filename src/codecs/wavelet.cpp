@@ -136,7 +136,7 @@ std::array<Band, kBands> bands_of(const Tile& tile) {
         const int high_rows = level.height / 2;
         const std::ptrdiff_t stride = 2 * level.stride;
         float* high_row = level.samples + (high_rows > 0 ? level.stride : 0);
-        Band* band = &bands[static_cast<std::size_t>(1 + 3 * (kWaveletLevels - 1 - number))];
+        Band* band = bands.data() + 1 + 3 * (kWaveletLevels - 1 - number);
         band[0] = {level.samples + low_columns, high_columns, low_rows, stride};
         band[1] = {high_row, low_columns, high_rows, stride};
         band[2] = {high_row + low_columns, high_columns, high_rows, stride};

@@ -54,7 +54,8 @@ JpegSteps jpeg_steps(int quality, double base) {
     JpegSteps steps{};
     for (int i = 0; i < 64; ++i) {
         const double most = i == 0 ? kMostMeanLevel : kMostLevel;
-        const double wanted = level + base + kSlope * (i / 8 + i % 8);
+        const int diagonal = i / 8 + i % 8;
+        const double wanted = level + base + kSlope * diagonal;
         const double exponent = std::clamp(std::floor(wanted + spread(i)), 0.0, most);
         steps[static_cast<std::size_t>(i)] = 1U << static_cast<unsigned>(exponent);
     }
