@@ -56,7 +56,7 @@ std::size_t BandCoder::context(const std::uint32_t* current, const std::uint32_t
 
 void BandCoder::put(RangeEncoder& coder, std::uint32_t magnitude, int most_bits,
                     std::size_t context) {
-    const int length = std::bit_width(magnitude);
+    const int length = static_cast<int>(std::bit_width(magnitude));
     auto& lengths = models_.lengths[context];
     for (int i = 0; i < length; ++i) coder.put(true, lengths[static_cast<std::size_t>(i)]);
     if (length < most_bits) coder.put(false, lengths[static_cast<std::size_t>(length)]);
@@ -89,7 +89,7 @@ void BandCoder::encode(RangeEncoder& coder, const Band& band, float step) {
     std::int32_t largest = 0;
     const float magnitude = largest_magnitude(band);
     quantise(&magnitude, inverse, 1, &largest);
-    const int most_bits = std::bit_width(static_cast<std::uint32_t>(largest));
+    const int most_bits = static_cast<int>(std::bit_width(static_cast<std::uint32_t>(largest)));
     coder.put_bits(static_cast<std::uint32_t>(most_bits), kLengthBits);
     if (most_bits == 0) return;
 

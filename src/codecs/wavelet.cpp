@@ -100,7 +100,7 @@ void forward_wavelet(const Tile& tile, float* spare) {
     for (int number = 0; number < kWaveletLevels; ++number) {
         const Tile level = level_of(tile, number);
         if (level.height > 1) {
-            for (int i = 0; i < 4; ++i) lift_rows(level, i % 2 == 0 ? 1 : 0, kLift[i]);
+            for (std::size_t i = 0; i < 4; ++i) lift_rows(level, i % 2 == 0 ? 1 : 0, kLift[i]);
             scale_rows(level, kScale);
         }
         if (level.width == 1) continue;
@@ -120,7 +120,7 @@ void inverse_wavelet(const Tile& tile, float* spare) {
         }
         if (level.height == 1) continue;
         scale_rows(level, 1 / kScale);
-        for (int i = 3; i >= 0; --i) lift_rows(level, i % 2 == 0 ? 1 : 0, -kLift[i]);
+        for (std::size_t i = 4; i-- > 0;) lift_rows(level, i % 2 == 0 ? 1 : 0, -kLift[i]);
     }
 }
 

@@ -93,7 +93,7 @@ BytePlanes exact_planes(const Image& image, std::size_t count) {
 }
 
 int bits_of(const SampleRange& range) {
-    return std::bit_width(static_cast<std::uint32_t>(range.high - range.low));
+    return static_cast<int>(std::bit_width(static_cast<std::uint32_t>(range.high - range.low)));
 }
 
 }  // namespace
