@@ -11,12 +11,19 @@ namespace {
 
 constexpr float kMostMagnitude = (1 << kMostBits) - 1;
 
+struct Quantiser {
+    float inverse;  // of the step
+    float least;    // magnitudes below it become 0
+};
+
 // Nearest; halves away from zero.
-void quantise(const float* coefficients, float inverse, std::size_t count, std::int32_t* out) {
+void quantise(const float* coefficients, const Quantiser& by, std::size_t count,
+              std::int32_t* out) {
     for (std::size_t x = 0; x < count; ++x) {
-        float scaled = coefficients[x] * inverse;
+        float scaled = coefficients[x] * by.inverse;
         scaled = scaled < -kMostMagnitude ? -kMostMagnitude : scaled;
         scaled = scaled > kMostMagnitude ? kMostMagnitude : scaled;
+        scaled = std::fabs(coefficients[x]) < by.least ? 0.0F : scaled;
         out[x] = static_cast<std::int32_t>(scaled + std::copysign(0.5F, scaled));
     }
 }
@@ -82,20 +89,20 @@ void BandCoder::next_row(std::size_t width) {
               above_.begin() + static_cast<std::ptrdiff_t>(2 * kMargin + width), 0U);
 }
 
-void BandCoder::encode(RangeEncoder& coder, const Band& band, float step) {
+void BandCoder::encode(RangeEncoder& coder, const Band& band, float step, float least) {
     if (band.width == 0 || band.height == 0) return;
-    const float inverse = 1 / step;
+    const Quantiser by{1 / step, least};
     const auto width = static_cast<std::size_t>(band.width);
     std::int32_t largest = 0;
     const float magnitude = largest_magnitude(band);
-    quantise(&magnitude, inverse, 1, &largest);
+    quantise(&magnitude, by, 1, &largest);
     const int most_bits = static_cast<int>(std::bit_width(static_cast<std::uint32_t>(largest)));
     coder.put_bits(static_cast<std::uint32_t>(most_bits), kLengthBits);
     if (most_bits == 0) return;
 
     std::fill(above_.begin(), above_.end(), 0U);
     for (int y = 0; y < band.height; ++y) {
-        quantise(band.first + y * band.stride, inverse, width, row_.data());
+        quantise(band.first + y * band.stride, by, width, row_.data());
         std::uint32_t* current = current_.data() + kMargin;
         const std::uint32_t* above = above_.data() + kMargin;
         for (std::size_t x = 0; x < width; ++x) {

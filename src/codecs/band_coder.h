@@ -22,8 +22,9 @@ class BandCoder {
 
     // Forgets everything.
     void reset();
-    // Codes coefficient / step, rounded to the nearest integer.
-    void encode(RangeEncoder& coder, const Band& band, float step);
+    // Codes coefficient / step: 0 for magnitudes below `least`, which is half a step or more, and
+    // the nearest integer for all others.
+    void encode(RangeEncoder& coder, const Band& band, float step, float least);
     // Sets every coefficient of the band to a multiple of step.
     void decode(RangeDecoder& coder, const Band& band, float step);
 

@@ -14,14 +14,12 @@ namespace zq {
 
 namespace {
 
-using PlaneSteps = std::array<WaveletSteps, kMostPlanes>;
-
 // The ranges of a block and what follows from them.
 struct Plan {
     PlaneLayout layout;
     SampleRanges ranges;
     std::array<SampleScale, kMostPlanes> scales;
-    PlaneSteps steps{};
+    std::array<WaveletSteps, kMostPlanes> steps{};
 
     Plan(PixelType type, const SampleRanges& found)
         : layout(plane_layout(type)), ranges(found), scales{} {
@@ -76,8 +74,8 @@ void for_each_tile(const Image& image, Visit&& visit) {
     }
 }
 
-float step_of(std::int8_t exponent) {
-    return std::ldexp(1.0F, exponent);
+float step_of(const WaveletStep& step) {
+    return std::ldexp(1.0F, step.exponent);
 }
 
 void encode_tile(Bytes& out, const Image& image, const PixelRect& rect, const Plan& plan,
@@ -90,7 +88,8 @@ void encode_tile(Bytes& out, const Image& image, const PixelRect& rect, const Pl
         bench.coder().reset();
         const auto bands = bands_of(tile);
         for (std::size_t i = 0; i < bands.size(); ++i) {
-            bench.coder().encode(coder, bands[i], step_of(plan.steps[plane][i]));
+            const WaveletStep& step = plan.steps[plane][i];
+            bench.coder().encode(coder, bands[i], step_of(step), step.least);
         }
     }
     coder.finish();
@@ -132,9 +131,10 @@ SampleRanges read_ranges(StreamReader& reader, const PlaneLayout& layout) {
 
 void read_steps(StreamReader& reader, Plan& plan) {
     for (std::size_t plane = 0; plane < plan.layout.planes; ++plane) {
-        for (std::int8_t& step : plan.steps[plane]) {
-            step = static_cast<std::int8_t>(reader.u8());
-            if (step < kFinestStep || step > kCoarsestStep) throw kInitializationError;
+        for (WaveletStep& step : plan.steps[plane]) {
+            step.exponent = static_cast<std::int8_t>(reader.u8());
+            if (step.exponent < kFinestStep || step.exponent > kCoarsestStep)
+                throw kInitializationError;
         }
     }
 }
@@ -157,7 +157,9 @@ void put_planes_of(Bytes& out, const Image& image, int quality) {
     for (std::size_t i = 0; i < layout.planes; ++i) {
         const bool is_colour = i > 0 && !layout.is_float;
         plan.steps[i] = wavelet_steps(quality, is_colour, finest_step(plan.ranges[i], layout));
-        for (const std::int8_t step : plan.steps[i]) out.push_back(static_cast<std::uint8_t>(step));
+        for (const WaveletStep& step : plan.steps[i]) {
+            out.push_back(static_cast<std::uint8_t>(step.exponent));
+        }
     }
     put_lossless(out, image);
     if (plan.is_constant()) return;

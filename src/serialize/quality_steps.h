@@ -1,5 +1,5 @@
-// How coarsely each quality quantises. Steps are powers of two and only ever halve as the quality
-// rises, so what a lower quality can express a higher one can: no coefficient gets worse.
+// How coarsely each quality quantises. As the quality rises a step is only ever divided by a whole
+// number, so what a lower quality can express a higher one can: no coefficient gets worse.
 #pragma once
 
 #include <array>
@@ -19,7 +19,11 @@ JpegSteps chroma_steps(int quality);
 inline constexpr int kNominalBits = 16;
 inline constexpr int kFinestStep = -1;
 inline constexpr int kCoarsestStep = 16;
-using WaveletSteps = std::array<std::int8_t, kBands>;
+struct WaveletStep {
+    std::int8_t exponent = 0;
+    float least = 0;  // magnitudes below it become 0; half a step or more
+};
+using WaveletSteps = std::array<WaveletStep, kBands>;
 
 // Never finer than 2^finest. Planes that hold colour rather than brightness are coded more
 // coarsely.

@@ -148,7 +148,7 @@ TEST(BandCoderTest, MultiplesOfTheStepComeBack) {
         const Band band{field.samples.data(), 61, 9, Field::kStride};
         Bytes bytes;
         RangeEncoder encoder(bytes);
-        BandCoder(61).encode(encoder, band, 0.5F);
+        BandCoder(61).encode(encoder, band, 0.5F, 0.25F);
         encoder.finish();
         for (int y = 0; y < 9; ++y) std::fill_n(&field.at(0, y), 61, 7.0F);
         RangeDecoder decoder(bytes);
