@@ -18,12 +18,12 @@ struct Division {
     int due;  // the level at which it takes place; levels fall
     std::uint8_t place;
     std::uint8_t divisor;
-    bool tells;  // on any photograph, however smooth
+    bool tells;  // in photographs of ordinary contrast
 };
 
 // From the coarsest step to 1. `due` is the level of the step before, and lower the more is gained
-// at once. Steps of high frequencies are passed by nearly all coefficients of smooth pictures
-// while they are large: squared frequencies below `reach` are not.
+// at once. While a step is large, only frequencies whose square is below `reach` have coefficients
+// that are larger; the others tell nothing yet.
 struct Rung {
     int due, divisor, reach;
 };
@@ -31,7 +31,7 @@ constexpr Rung kLadder[] = {{506, 2, 17}, {442, 2, 26},  {378, 2, 42},
                             {314, 2, 60}, {231, 3, 128}, {106, 5, 128}};
 constexpr unsigned kCoarsest = 240;  // baseline JPEG has steps of 8 bits
 
-// The mean of a block ends up on the step 8, a grey level, where photographs look right.
+// The mean is finer by half an octave: at quality 75 its step is 8, one grey level.
 constexpr unsigned kCoarsestMean = 128;
 constexpr int kMeanRungs = 7;
 constexpr int kMeanDue = 38;
