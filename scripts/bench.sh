@@ -7,12 +7,14 @@ set -euo pipefail
 target=native
 case ${1:-} in native | win64 | win32) target=$1; shift ;; esac
 [[ $target != native ]] || need libopencv-imgproc-dev
-build_preset "$target" zqvis_bench
+build_preset "$target" zqvis_bench zqvis_codec_bench
 [[ $target != win32 ]] || win32_setup
 say "benchmarks ($target)"
 cd "build/$target/bin"
-case $target in
-    native) exec ./zqvis_bench "$@" ;;
-    win64) exec "$ZQVISSVC_WINE64" ./zqvis_bench.exe "$@" ;;
-    win32) exec "${ZQVISSVC_RUN_WIN32%%;*}" "${ZQVISSVC_RUN_WIN32#*;}" zqvis_bench.exe "$@" ;;
-esac
+for program in zqvis_bench zqvis_codec_bench; do
+    case $target in
+        native) "./$program" "$@" ;;
+        win64) "$ZQVISSVC_WINE64" "./$program.exe" "$@" ;;
+        win32) "${ZQVISSVC_RUN_WIN32%%;*}" "${ZQVISSVC_RUN_WIN32#*;}" "$program.exe" "$@" ;;
+    esac
+done

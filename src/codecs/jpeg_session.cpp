@@ -1,0 +1,54 @@
+// libjpeg's structures and errors.
+#include "codecs/jpeg_session.h"
+
+#include <jerror.h>
+
+namespace zq {
+
+JpegSession::JpegSession() {
+    jpeg_std_error(&errors_);
+    errors_.error_exit = on_error;
+    errors_.emit_message = on_message;
+}
+
+// The only place that libjpeg's errors come back to.
+bool JpegSession::guarded(void (*step)(void*), void* target) noexcept {
+    if (setjmp(back_) != 0) return false;
+    step(target);
+    return true;
+}
+
+void JpegSession::fail(j_common_ptr jpeg, GRLIBError_enum code) {
+    auto* session = static_cast<JpegSession*>(jpeg->client_data);
+    session->failure_ = code;
+    std::longjmp(session->back_, 1);
+}
+
+void JpegSession::on_error(j_common_ptr jpeg) {
+    fail(jpeg, jpeg->err->msg_code == JERR_OUT_OF_MEMORY ? kNotEnoughMemory : kSuccess);
+}
+
+// Warnings have level -1; what is above is tracing.
+void JpegSession::on_message(j_common_ptr jpeg, int level) {
+    if (level < 0) ++jpeg->err->num_warnings;
+}
+
+JpegCompressor::JpegCompressor() {
+    attach(jpeg_);
+    run(kNotEnoughMemory, [this] { jpeg_create_compress(&jpeg_); });
+}
+
+JpegCompressor::~JpegCompressor() {
+    jpeg_destroy_compress(&jpeg_);
+}
+
+JpegDecompressor::JpegDecompressor() {
+    attach(jpeg_);
+    run(kNotEnoughMemory, [this] { jpeg_create_decompress(&jpeg_); });
+}
+
+JpegDecompressor::~JpegDecompressor() {
+    jpeg_destroy_decompress(&jpeg_);
+}
+
+}  // namespace zq
