@@ -25,15 +25,18 @@ struct Baseline {
     Job job;  // empty: cannot be run here
 };
 
-// memcpy that moves as many bytes as a job reads and writes for each pixel together.
-inline Baseline memcpy_of(std::size_t bytes_per_pixel) {
-    const std::size_t bytes = kPixels * bytes_per_pixel / 2;
+inline Baseline memcpy_named(std::string name, std::size_t bytes) {
     const auto source = std::make_shared<std::vector<char>>(bytes, 'a');
     const auto destination = std::make_shared<std::vector<char>>(bytes);
-    return {"memcpy", [=] {
+    return {std::move(name), [=] {
                 std::memcpy(destination->data(), source->data(), bytes);
                 benchmark::ClobberMemory();
             }};
+}
+
+// memcpy that moves as many bytes as a job reads and writes for each pixel together.
+inline Baseline memcpy_of(std::size_t bytes_per_pixel) {
+    return memcpy_named("memcpy", kPixels * bytes_per_pixel / 2);
 }
 
 // Reports megapixels a second, and how many times the throughput of each baseline that is.

@@ -6,6 +6,7 @@
 #include <cstring>
 #include <limits>
 #include <memory>
+#include <new>
 #include <utility>
 
 #if __has_include(<sanitizer/asan_interface.h>)
@@ -40,6 +41,17 @@ bool is_size(int64_t size) {
 std::string describe(const char* what, size_t size, uint64_t number) {
     return std::string(what) + " of " + std::to_string(size) + " bytes (allocation " +
            std::to_string(number) + ")";
+}
+
+// Disposing never fails for want of memory; what can not be remembered is given up at once.
+template <class Queue>
+bool remember(Queue& queue, const typename Queue::value_type& value) {
+    try {
+        queue.push_back(value);
+        return true;
+    } catch (const std::bad_alloc&) {
+        return false;
+    }
 }
 
 const char* pool_name(Pool pool) {
@@ -120,10 +132,10 @@ int32_t Heap::dispose(Pool pool, ZqHandle handle, const char* service) {
     }
     Entry* entry = find(pool, handle, service);
     if (entry == nullptr) return kBadArgument;
-    retired_.push_back(handle);
     retire(*handle, *entry);
     *handle = nullptr;
     handles_.erase(handle);
+    if (!remember(retired_, handle)) std::free(handle);
     if (retired_.size() > kMaxRetired) {
         std::free(retired_.front());
         retired_.pop_front();
@@ -207,11 +219,10 @@ int32_t Heap::dispose_block(void* block, const char* service) {
 }
 
 void Heap::retire(void* address, const Entry& entry) {
-    if (!strict_) {
+    if (!strict_ || !remember(relics_, {address, entry.size, entry.number})) {
         std::free(address);
         return;
     }
-    relics_.push_back({address, entry.size, entry.number});
     std::memset(address, kStaleByte, entry.size);
     ASAN_POISON_MEMORY_REGION(address, entry.size);
     relic_bytes_ += entry.size;

@@ -7,6 +7,7 @@
 #include "custom_data.h"
 #include "errors.h"
 #include "files.h"
+#include "flatten.h"
 #include "host.h"
 #include "image.h"
 #include "slots.h"

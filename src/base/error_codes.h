@@ -39,10 +39,13 @@ enum GRLIBError_enum : std::int32_t {
     kDiskFull = -1074395983,
     kPaletteSize = -1074395976,
     kInitializationError = -1074395960,
+    kQuality = -1074395956,
     kCustomDataSize = -1074395724,
     kCustomDataKey = -1074395723,
     kBitDepth = -1074395721,
     kValueNotInEnumeration = -1074395713,
+    kCompressionType = -1074395704,
+    kFlattenKind = -1074395703,
     kNullPointer = -1074395269,
     kInvalidCoordinate = -1074395261,
     // The older family of the buffer-level file functions.

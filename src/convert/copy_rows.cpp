@@ -7,6 +7,15 @@
 
 namespace zq {
 
+void copy_block(void* to, const void* from, std::size_t bytes) {
+    if (stores_for(bytes) == Stores::kStreamed) {
+        stream_copy(to, from, bytes);
+        finish_streaming();
+    } else if (bytes > 0) {
+        std::memcpy(to, from, bytes);
+    }
+}
+
 void copy_rows(ConstRows from, Rows to, std::size_t rows, std::size_t bytes) {
     const bool streamed = stores_for(rows * bytes) == Stores::kStreamed;
     for (std::size_t y = 0; y < rows; ++y) {

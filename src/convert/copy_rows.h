@@ -26,6 +26,9 @@ struct Rows {
     std::ptrdiff_t stride;
 };
 
+// memcpy for blocks of any size; large ones are written past the cache.
+void copy_block(void* to, const void* from, std::size_t bytes);
+
 // Copies `bytes` of each of `rows` rows; the two do not overlap.
 void copy_rows(ConstRows from, Rows to, std::size_t rows, std::size_t bytes);
 

@@ -7,7 +7,9 @@
 #include <string_view>
 #include <utility>
 
+#include "base/required.h"
 #include "host/boundary.h"
+#include "image/attachment_classes.h"
 #include "image/image_lock.h"
 #include "image/lifecycle.h"
 #include "image/memory.h"
@@ -19,14 +21,6 @@ namespace {
 
 std::string_view text_of(const char* name) {
     return name == nullptr ? std::string_view() : name;
-}
-
-template <class T>
-T& required(T* target) {
-    if (target == nullptr) {
-        throw kNullPointer;
-    }
-    return *target;
 }
 
 // Checks the target before there is an image to lose.
@@ -48,30 +42,11 @@ std::span<const ImageHandle> request(const ZqImageHandle* images, int32_t count)
     return {images, static_cast<std::size_t>(count)};
 }
 
-// A client's object behind the library's interface. It is the client's until own() is called.
-class ForeignAttachment final : public Attachment {
-  public:
-    explicit ForeignAttachment(void* object) : object_(object) {}
-    ~ForeignAttachment() override {
-        if (destroy_ != nullptr) {
-            destroy_(object_);
-        }
-    }
-    ForeignAttachment(const ForeignAttachment&) = delete;
-    ForeignAttachment& operator=(const ForeignAttachment&) = delete;
-    void own(ZqDestroyProc destroy) { destroy_ = destroy; }
-    void* object() const { return object_; }
-
-  private:
-    void* object_;
-    ZqDestroyProc destroy_ = nullptr;
-};
-
 class ForeignExtraInfo final : public ImageExtraInfo {
   public:
     ForeignExtraInfo(void* object, ZqRemoveKindProc on_remove, ZqDestroyProc destroy)
-        : owned_(object), remove_kind_(on_remove) {
-        owned_.own(destroy);
+        : owned_({}), remove_kind_(on_remove) {
+        owned_.own(object, destroy);
     }
     void remove_kind(std::int32_t kind) override {
         if (remove_kind_ != nullptr) {
@@ -179,10 +154,11 @@ ZqError ZQ_CALL ZqSetAttachment(ZqImageHandle image, const ZqClassId* classId, v
     return host::run_core([&] {
         const ClassId& id = required(classId);
         const LockedImage locked(image);
-        auto attachment = std::make_unique<ForeignAttachment>(object);
+        auto attachment = std::make_unique<ForeignAttachment>(id);
         ForeignAttachment* owned = attachment.get();
-        locked->attachments().set(id, std::move(attachment));
-        owned->own(destroy);
+        AttachmentList::Entry entry = AttachmentList::make_entry(id, std::move(attachment));
+        owned->own(object, destroy);
+        locked->attachments().set(std::move(entry));
     });
 }
 
@@ -196,6 +172,20 @@ ZqError ZQ_CALL ZqFindAttachment(ZqImageHandle image, const ZqClassId* classId, 
 
 ZqError ZQ_CALL ZqRemoveAttachment(ZqImageHandle image, const ZqClassId* classId) {
     return host::run_core([&] { LockedImage(image)->attachments().remove(required(classId)); });
+}
+
+ZqError ZQ_CALL ZqRegisterAttachmentClass(const ZqAttachmentClass* description) {
+    return host::run_core([&] {
+        const ZqAttachmentClass& asked = required(description);
+        if (asked.flattenedSize == nullptr || asked.flatten == nullptr || asked.create == nullptr) {
+            throw kNullPointer;
+        }
+        register_attachment_class(asked);
+    });
+}
+
+ZqError ZQ_CALL ZqUnregisterAttachmentClass(const ZqClassId* classId) {
+    return host::run_core([&] { unregister_attachment_class(required(classId)); });
 }
 
 ZqError ZQ_CALL ZqSetExtraInfo(ZqImageHandle image, void* object, ZqRemoveKindProc removeKind,

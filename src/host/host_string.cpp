@@ -50,4 +50,10 @@ void copy_string(ZqStringHandle* target, ZqStringHandle source) {
     std::memcpy(bytes, view(source).data(), length);
 }
 
+std::uint8_t* extend_string(ZqStringHandle* target, std::size_t bytes, Extension extension) {
+    if (target == nullptr) throw kNullPointer;
+    const std::size_t kept = extension == Extension::kAppend ? view(*target).size() : 0;
+    return resize_string(target, checked_add(kept, bytes)) + kept;
+}
+
 }  // namespace zq::host

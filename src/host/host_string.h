@@ -3,6 +3,8 @@
 
 #include <zqvissvc/types.h>
 
+#include <cstddef>
+#include <cstdint>
 #include <string_view>
 
 namespace zq::host {
@@ -17,5 +19,10 @@ void set_string(ZqStringHandle* target, std::string_view text);
 
 // The same from another host string.
 void copy_string(ZqStringHandle* target, ZqStringHandle source);
+
+// Makes the string longer by that many bytes, or, to replace what it holds, that many bytes long.
+// The bytes are the caller's to fill, the first one is returned. Throws as set_string does.
+enum class Extension { kAppend, kReplace };
+std::uint8_t* extend_string(ZqStringHandle* target, std::size_t bytes, Extension extension);
 
 }  // namespace zq::host

@@ -9,7 +9,6 @@
 #include "host/services.h"
 #include "image/image_lock.h"
 #include "image/lifecycle.h"
-#include "image/registry.h"
 
 namespace zq::host {
 
@@ -36,8 +35,24 @@ void leave_host(Image& image) noexcept {
     }
 }
 
-bool is_live_image(ImageHandle image) {
-    return Registry::instance().pin(Image::object_address(image)).tag == kImageTag;
+// Has the host register a value and remembers the cookie that it gives.
+template <class Register>
+void register_by(ImageHandle image, Register ask_host) {
+    add_dispose_listener(leave_host);
+    std::uint32_t cookie = 0;
+    const std::int32_t status = ask_host(&cookie);
+    if (status != 0) {
+        throw status == kHostOutOfMemory ? kNotEnoughMemory : kSystemError;
+    }
+    std::uint32_t old_cookie = 0;
+    try {
+        const LockedImage locked(image);
+        old_cookie = std::exchange(locked->record().hostCookie, cookie);
+    } catch (...) {
+        remove_session(cookie);
+        throw;
+    }
+    remove_session(old_cookie);
 }
 
 }  // namespace
@@ -78,23 +93,38 @@ void set_cookie(ImageHandle image, std::uint32_t cookie) {
 }
 
 void register_session(ImageHandle image, ZqStringHandle name) {
-    add_dispose_listener(leave_host);
     const auto register_value = ud_register_session.require();
     const ZqImageValue value = {name, image};
-    std::uint32_t cookie = 0;
-    const std::int32_t status = register_value(kSessionType, &value, &cookie);
-    if (status != 0) {
-        throw status == kHostOutOfMemory ? kNotEnoughMemory : kSystemError;
+    register_by(
+        image, [&](std::uint32_t* cookie) { return register_value(kSessionType, &value, cookie); });
+}
+
+void register_flattened(ImageHandle image, ZqStringHandle name, ZqStringHandle flattened,
+                        std::uint32_t version) {
+    const ZqImageValue value = {name, image};
+    if (const auto with_version = ud_register_session_flatten2.find()) {
+        register_by(image, [&](std::uint32_t* cookie) {
+            return with_version(kSessionType, &value, flattened, version, cookie);
+        });
+    } else if (const auto with_bytes = ud_register_session_flatten.find()) {
+        register_by(image, [&](std::uint32_t* cookie) {
+            return with_bytes(kSessionType, &value, flattened, cookie);
+        });
+    } else {
+        register_session(image, name);
     }
-    std::uint32_t old_cookie = 0;
-    try {
-        const LockedImage locked(image);
-        old_cookie = std::exchange(locked->record().hostCookie, cookie);
-    } catch (...) {
-        remove_session(cookie);
-        throw;
-    }
-    remove_session(old_cookie);
+}
+
+ImageHandle find_session(std::uint32_t cookie, std::string_view name) {
+    const auto to_name = ud_cookie_to_name.find();
+    if (cookie == 0 || to_name == nullptr) return nullptr;
+    ZqStringHandle known_name = nullptr;
+    void* session = nullptr;
+    const bool known =
+        to_name(kSessionType, cookie, &known_name, &session) == 0 && view(known_name) == name;
+    if (known_name != nullptr) ds_dispose_handle(reinterpret_cast<ZqHandle>(known_name));
+    const auto image = static_cast<ImageHandle>(session);
+    return known && is_live_image(image) ? image : nullptr;
 }
 
 void dispose_at_teardown(ImageHandle image) {

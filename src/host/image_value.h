@@ -4,6 +4,7 @@
 
 #include <zqvissvc/types.h>
 
+#include <cstdint>
 #include <string_view>
 
 #include "base/error_codes.h"
@@ -34,6 +35,15 @@ ImageHandle require_image(const ZqImageValue* value);
 // that the image had is removed. Throws kNotInitialized when the host lacks the service,
 // kNotEnoughMemory when it has no memory, kSystemError when it refuses for another reason.
 void register_session(ImageHandle image, ZqStringHandle name);
+
+// Registers a value that was made of flattened bytes, as register_session does, by the service that
+// the host has for that, if any.
+void register_flattened(ImageHandle image, ZqStringHandle name, ZqStringHandle flattened,
+                        std::uint32_t version);
+
+// The live image that the host knows by the cookie under exactly this name, or null; also when the
+// host lacks the service.
+ImageHandle find_session(std::uint32_t cookie, std::string_view name);
 
 // Makes the host dispose the image when it tears the caller down.
 void dispose_at_teardown(ImageHandle image);

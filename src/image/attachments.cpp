@@ -32,18 +32,34 @@ AttachmentList::Node* AttachmentList::find_node(const ClassId& id) const {
     return nullptr;
 }
 
+void AttachmentList::NodeDeleter::operator()(Node* node) const {
+    delete node;
+}
+
+AttachmentList::Entry AttachmentList::make_entry(const ClassId& id,
+                                                 std::unique_ptr<Attachment> attachment) {
+    Entry entry(new Node);
+    entry->id = id;
+    entry->attachment = std::move(attachment);
+    return entry;
+}
+
 void AttachmentList::set(const ClassId& id, std::unique_ptr<Attachment> attachment) {
-    if (Node* node = find_node(id)) {
-        node->attachment = std::move(attachment);
+    set(make_entry(id, std::move(attachment)));
+}
+
+void AttachmentList::set(Entry entry) noexcept {
+    if (entry == nullptr) {
         return;
     }
-    auto node = std::make_unique<Node>();
-    node->id = id;
-    node->attachment = std::move(attachment);
-    node->next = &head_;
-    node->previous = head_.previous;
-    head_.previous->next = node.get();
-    head_.previous = node.release();
+    if (Node* node = find_node(entry->id)) {
+        node->attachment = std::move(entry->attachment);
+        return;
+    }
+    entry->next = &head_;
+    entry->previous = head_.previous;
+    head_.previous->next = entry.get();
+    head_.previous = entry.release();
     ++head_.count;
 }
 
@@ -66,13 +82,13 @@ void AttachmentList::clear() {
     head_.previous = &head_;
     head_.count = 0;
     while (link != &head_) {
-        const std::unique_ptr<Node> owner(static_cast<Node*>(link));
+        const Entry owner(static_cast<Node*>(link));
         link = link->next;
     }
 }
 
 void AttachmentList::erase(Node* node) {
-    const std::unique_ptr<Node> owner(node);
+    const Entry owner(node);
     node->previous->next = node->next;
     node->next->previous = node->previous;
     --head_.count;

@@ -5,6 +5,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <memory>
+#include <vector>
 
 #include "image/class_id.h"
 
@@ -14,6 +15,9 @@ namespace zq {
 class Attachment {
   public:
     virtual ~Attachment() = default;
+    // The object as bytes from which its class can make it again; empty when it can not be carried.
+    // Throws kNotEnoughMemory, or whatever code the object's owner gives.
+    virtual std::vector<std::uint8_t> flattened() const { return {}; }
 };
 
 // Extra information: one object a image that holds parts of several kinds.
@@ -26,7 +30,16 @@ class ImageExtraInfo {
 
 // A circular list with one entry a class. Threads: the image's lock.
 class AttachmentList {
+    struct Node;
+    struct NodeDeleter {
+        void operator()(Node* node) const;
+    };
+
   public:
+    // An object ready to be attached: what may fail is behind it.
+    using Entry = std::unique_ptr<Node, NodeDeleter>;
+    static Entry make_entry(const ClassId& id, std::unique_ptr<Attachment> attachment);
+
     AttachmentList();
     ~AttachmentList();
     AttachmentList(const AttachmentList&) = delete;
@@ -34,6 +47,8 @@ class AttachmentList {
 
     // Takes the object; one of the same class that was there is destroyed.
     void set(const ClassId& id, std::unique_ptr<Attachment> attachment);
+    // The same without anything that could fail; an empty entry does nothing.
+    void set(Entry entry) noexcept;
     // Borrowed; null when absent.
     Attachment* find(const ClassId& id) const;
     // False when absent.
@@ -51,7 +66,6 @@ class AttachmentList {
         Link* next;
         Link* previous;
     };
-    struct Node;
     // Four machine words; 16 bytes in a 32-bit process.
     struct Head : Link {
         std::uintptr_t count;

@@ -60,6 +60,20 @@ std::uint8_t* Image::pixel(std::int32_t x, std::int32_t y) const {
     return row(y) + std::ptrdiff_t{x} * bytes_per_pixel(type());
 }
 
+std::span<std::uint8_t> Image::whole_rows() const {
+    if (record_.firstPixel == nullptr || record_.width == 0) {
+        return {};
+    }
+    const auto border = std::ptrdiff_t{record_.border};
+    const std::ptrdiff_t pixel_bytes = bytes_per_pixel(type());
+    const std::ptrdiff_t rows = record_.height + 2 * border;
+    const std::ptrdiff_t last_row = source_ == BufferSource::kExternal
+                                        ? (record_.width + 2 * border) * pixel_bytes
+                                        : row_stride();
+    return {row(0) - border * (row_stride() + pixel_bytes),
+            static_cast<std::size_t>((rows - 1) * row_stride() + last_row)};
+}
+
 std::uint8_t* Image::lend() {
     if (external_count_ == std::numeric_limits<std::int32_t>::max()) {
         throw kSystemError;
@@ -83,10 +97,10 @@ void Image::refuse_when_lent() const {
 }
 
 void Image::set_bit_depth(std::int32_t bits) {
-    if (bits != 0 && (bits < 8 || bits > 16 || !has_bit_depth(type()))) {
+    if (bits != 0 && !is_bit_depth(bits)) {
         throw kBitDepth;
     }
-    bit_depth_ = bits;
+    setting_ = bits;
 }
 
 void Image::set_extra_info(std::unique_ptr<ImageExtraInfo> extra) {

@@ -7,6 +7,7 @@
 #include <cstdint>
 #include <memory>
 #include <optional>
+#include <span>
 #include <string_view>
 
 #include "image/attachments.h"
@@ -68,11 +69,13 @@ class Image final : public Object {
     // kPhysical: when the allocator is there but refuses, the image is left without pixels.
     // reinitialise also throws kInvalidImageType
     // and then leaves the image without pixels.
-    void reinitialise(const ImageShape& shape);
+    void reinitialise(const ImageShape& shape, ResizeMode mode = ResizeMode::kPlain);
     void resize(std::int32_t width, std::int32_t height, std::optional<std::int32_t> new_type,
                 ResizeMode mode);
     // resize in mode kPlain, and the border with it, in one step.
     void resize(std::int32_t width, std::int32_t height, std::int32_t border);
+    // The same with a type; a greedy flag has no effect.
+    void resize(const ImageShape& shape);
     // Re-lays the buffer; the pixels of the image proper are kept, the border's are undefined.
     void set_border(std::int32_t border);
     // Makes the caller's buffer the image's pixels, the first byte being pixel (-border, -border).
@@ -86,6 +89,8 @@ class Image final : public Object {
     // (a lent or greedy image, or one over an external or physical buffer, is resized and copied
     // into). Throws as resize does and leaves the image as it was.
     void adopt(Image& source);
+    // The same for a source of any border, with its size and its pixels.
+    void adopt_with_border(Image& source);
 
     // Address of a pixel of the image or its border. Throws kImageTooSmall without pixels,
     // kInvalidCoordinate outside.
@@ -97,6 +102,11 @@ class Image final : public Object {
         return std::ptrdiff_t{record_.rowPixels} * bytes_per_pixel(type());
     }
 
+    // The rows of the image with its border, as one block from pixel (-border, -border) on: whole
+    // rows, except that an external buffer may end with the last pixel of its last row. Empty
+    // without pixels.
+    std::span<std::uint8_t> whole_rows() const;
+
     // Lending. lend returns the start of the buffer; give_back lowers the count, which never falls
     // below 0.
     std::uint8_t* lend();
@@ -106,7 +116,11 @@ class Image final : public Object {
     // 0 (not set), or 8 to 16 for I16 and RGB (U64); else throws kBitDepth. A type without a bit
     // depth resets it.
     void set_bit_depth(std::int32_t bits);
-    std::int32_t bit_depth() const { return bit_depth_; }
+    std::int32_t bit_depth() const { return is_bit_depth(setting_) ? setting_ : 0; }
+    // The word behind the bit depth, as flattened images carry it. Any number is kept, for whoever
+    // wrote it; one that can not be a bit depth of the type counts as not set.
+    void set_setting(std::int32_t setting) { setting_ = setting; }
+    std::int32_t setting() const { return setting_; }
 
     // What was subtracted from a 16-bit file's samples when the image was read (0, or negative):
     // value = sample + offset. A writer uses it again where it fits, so that a file's samples
@@ -126,6 +140,9 @@ class Image final : public Object {
 
   private:
     bool is_greedy() const { return record_.greedySize != kNotGreedy; }
+    bool is_bit_depth(std::int32_t bits) const {
+        return bits >= 8 && bits <= 16 && has_bit_depth(type());
+    }
     void refuse_when_lent() const;
     void reset_description(bool greedy);
     void reshape(const Extent& target, ResizeMode mode);
@@ -135,7 +152,8 @@ class Image final : public Object {
     void release_buffer() noexcept;
     void forget_pixels() noexcept;
     void exchange_pixels(Image& source);
-    void copy_pixels_from(const Image& source);
+    void copy_pixels_from(const Image& source, std::int32_t border);
+    void take_over(Image& source, std::int32_t copied_border);
     Layout layout_for(const Extent& target) const;
 
     static constexpr std::uint32_t kNotGreedy = 0xFFFFFFFF;
@@ -148,7 +166,7 @@ class Image final : public Object {
     Variant variant_;
     BufferSource source_ = BufferSource::kNone;
     std::int32_t external_count_ = 0;
-    std::int32_t bit_depth_ = 0;
+    std::int32_t setting_ = 0;
     std::int32_t sample_offset_ = 0;
     bool has_cleanup_procedure_ = false;
 };

@@ -59,12 +59,12 @@ void Image::reset_description(bool greedy) {
         record_.greedySize = greedy ? 0 : kNotGreedy;
     }
     memory_record_.words[0] = 0;
-    bit_depth_ = 0;
+    setting_ = 0;
     sample_offset_ = 0;
     set_extra_info(nullptr);
 }
 
-void Image::reinitialise(const ImageShape& shape) {
+void Image::reinitialise(const ImageShape& shape, ResizeMode mode) {
     refuse_when_lent();
     if (!is_pixel_type(shape.type)) {
         reset_description(shape.greedy);
@@ -77,7 +77,7 @@ void Image::reinitialise(const ImageShape& shape) {
     try {
         reshape(
             normalised(static_cast<PixelType>(shape.type), shape.width, shape.height, shape.border),
-            ResizeMode::kPlain);
+            mode);
     } catch (...) {
         record_.greedySize = old_greedy_size;
         throw;
@@ -93,6 +93,11 @@ void Image::resize(std::int32_t width, std::int32_t height, std::optional<std::i
 
 void Image::resize(std::int32_t width, std::int32_t height, std::int32_t border) {
     reshape(normalised(type(), width, height, border), ResizeMode::kPlain);
+}
+
+void Image::resize(const ImageShape& shape) {
+    reshape(normalised(to_pixel_type(shape.type), shape.width, shape.height, shape.border),
+            ResizeMode::kPlain);
 }
 
 Layout Image::layout_for(const Extent& target) const {
@@ -181,7 +186,7 @@ void Image::settle(const Extent& target, std::int32_t row_pixels) {
         record_.buffer == nullptr ? nullptr : place_first_pixel(record_.buffer, target, row_pixels);
     sample_offset_ = 0;
     if (!has_bit_depth(target.type)) {
-        bit_depth_ = 0;
+        setting_ = 0;
     }
 }
 
@@ -213,11 +218,11 @@ void Image::set_border(std::int32_t border) {
     Image relaid(Variant::kPrivate, {});
     relaid.record_.greedySize = record_.greedySize;
     relaid.reshape(target, ResizeMode::kPlain);
-    relaid.copy_pixels_from(*this);
-    const std::int32_t bits = bit_depth_;
+    relaid.copy_pixels_from(*this, 0);
+    const std::int32_t setting = setting_;
     const std::int32_t offset = sample_offset_;
     exchange_pixels(relaid);
-    bit_depth_ = bits;
+    setting_ = setting;
     sample_offset_ = offset;
 }
 
@@ -249,19 +254,27 @@ void Image::wrap_external(const ImageShape& shape, std::uint8_t* buffer, std::in
 }
 
 void Image::adopt(Image& source) {
+    take_over(source, 0);
+}
+
+void Image::adopt_with_border(Image& source) {
+    take_over(source, source.record_.border);
+}
+
+void Image::take_over(Image& source, std::int32_t copied_border) {
     const Extent wanted = source.extent();
-    const std::int32_t bits = source.bit_depth_;
+    const std::int32_t setting = source.setting_;
     const std::int32_t offset = source.sample_offset_;
     if (wanted == extent()) {
-        copy_pixels_from(source);
+        copy_pixels_from(source, copied_border);
     } else if (source_ != BufferSource::kExternal && source_ != BufferSource::kPhysical &&
                !is_greedy() && external_count_ == 0) {
         exchange_pixels(source);
     } else {
         reshape(wanted, ResizeMode::kPlain);
-        copy_pixels_from(source);
+        copy_pixels_from(source, copied_border);
     }
-    bit_depth_ = bits;
+    setting_ = setting;
     sample_offset_ = offset;
 }
 
@@ -278,13 +291,16 @@ void Image::exchange_pixels(Image& source) {
     std::swap(source_, source.source_);
 }
 
-void Image::copy_pixels_from(const Image& source) {
+// Of the border, as many pixels as the caller says.
+void Image::copy_pixels_from(const Image& source, std::int32_t border) {
     if (record_.firstPixel == nullptr || source.record_.firstPixel == nullptr) {
         return;
     }
-    copy_rows(row(0), row_stride(), source.row(0), source.row_stride(), record_.height,
-              static_cast<std::size_t>(record_.width) *
-                  static_cast<std::size_t>(bytes_per_pixel(type())));
+    const std::ptrdiff_t pixel_bytes = bytes_per_pixel(type());
+    const std::ptrdiff_t columns = std::ptrdiff_t{record_.width} + 2 * std::ptrdiff_t{border};
+    copy_rows(row(-border) - border * pixel_bytes, row_stride(),
+              source.row(-border) - border * pixel_bytes, source.row_stride(),
+              record_.height + 2 * border, static_cast<std::size_t>(columns * pixel_bytes));
 }
 
 }  // namespace zq

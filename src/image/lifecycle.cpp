@@ -3,7 +3,6 @@
 
 #include <array>
 #include <atomic>
-#include <functional>
 #include <memory>
 
 #include "image/lent_buffers.h"
@@ -71,10 +70,19 @@ Created new_named_image(const ImageShape& shape, std::string_view name, Variant 
     return find_or_create(name, variant, [&shape](Image& image) { image.reinitialise(shape); });
 }
 
+Created new_filled_image(std::string_view name, Variant variant,
+                         const std::function<void(Image&)>& fill) {
+    return find_or_create(name, variant, fill);
+}
+
 Created new_external_image(const ImageShape& shape, std::uint8_t* buffer, std::int32_t row_pixels,
                            std::string_view name) {
     return find_or_create(name, Variant::kRegistered,
                           [&](Image& image) { image.wrap_external(shape, buffer, row_pixels); });
+}
+
+bool is_live_image(ImageHandle handle) {
+    return Registry::instance().pin(Image::object_address(handle)).tag == kImageTag;
 }
 
 bool take_back_buffer(ImageHandle handle, std::uint8_t* buffer) {
@@ -108,7 +116,7 @@ void dispose_all_images() {
 void add_dispose_listener(DisposeListener listener) {
     for (auto& place : listeners) {
         DisposeListener expected = nullptr;
-        if (place.load() == listener || place.compare_exchange_strong(expected, listener)) {
+        if (place.compare_exchange_strong(expected, listener) || expected == listener) {
             return;
         }
     }

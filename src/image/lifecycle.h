@@ -2,6 +2,7 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
 #include <string_view>
 
 #include "image/image.h"
@@ -24,11 +25,20 @@ ImageHandle new_image(const ImageShape& shape);
 // made. An empty name makes an unnamed image.
 Created new_named_image(const ImageShape& shape, std::string_view name, Variant variant);
 
+// The same with pixels: `fill` gives an image, which nobody else can reach meanwhile, shape and
+// contents; it may be called for a second one when another thread was faster. What it throws leaves
+// no image behind.
+Created new_filled_image(std::string_view name, Variant variant,
+                         const std::function<void(Image&)>& fill);
+
 // As new_named_image, but the pixels are the caller's buffer, which must outlive its use by the
 // image and is never freed here. A later change of size gives the image a buffer of its own and
 // leaves the caller's alone. Also throws kExternalBufferAlignment and kNullPointer.
 Created new_external_image(const ImageShape& shape, std::uint8_t* buffer, std::int32_t row_pixels,
                            std::string_view name);
+
+// Whether the handle, which may be anything, is that of a live image; it may go at any moment.
+bool is_live_image(ImageHandle handle);
 
 // Takes back a buffer that `handle` lent: from the image while it lives, else from the buffer's
 // remaining users. False when there is no such image and it has lent no such buffer.

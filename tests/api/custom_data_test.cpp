@@ -231,7 +231,7 @@ TEST(CustomDataTest, ReportsUnderItsName) {
                            kKey, no_key},
                           {"KEMO Remove Custom Data",
                            [](V v, E e) { return DF_RemoveCustomData(v, "new", e); }, kKey, no_key},
-                          {"KEMO Enumerate Custom Keys",
+                          {"Kemo Enumerate Custom Keys",
                            [](V v, E e) { return DF_EnumerateCustomKeys(v, nullptr, e); },
                            kNullPointer, "Null pointer."}};
     HostImage live("live");

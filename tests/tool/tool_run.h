@@ -2,6 +2,9 @@
 // streams.
 #pragma once
 
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
 #include <cstdint>
 #include <cstdlib>
 #include <sstream>
@@ -89,5 +92,26 @@ class ToolFolder : public ScratchFolder {
         return text;
     }
 };
+
+using Text = testing::Matcher<std::string>;
+
+// A run of the tool and what must come of it; carriage returns in its output do not count.
+struct Case {
+    const char* arguments;
+    int status;
+    Text out;
+    Text err;
+};
+
+inline void run_cases(const ToolFolder& folder, const std::vector<Case>& cases) {
+    for (const Case& one : cases) {
+        SCOPED_TRACE(one.arguments);
+        Outcome outcome = folder.run(one.arguments);
+        std::erase(outcome.out, '\r');
+        EXPECT_EQ(outcome.status, one.status) << outcome.err;
+        EXPECT_THAT(outcome.out, one.out);
+        EXPECT_THAT(outcome.err, one.err);
+    }
+}
 
 }  // namespace zqtest

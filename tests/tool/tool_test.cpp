@@ -15,27 +15,9 @@ using testing::Eq;
 using testing::HasSubstr;
 using testing::IsEmpty;
 using zqtest::Outcome;
+using zqtest::run_cases;
+using zqtest::Text;
 using zqtest::ToolFolder;
-
-using Text = testing::Matcher<std::string>;
-
-struct Case {
-    const char* arguments;
-    int status;
-    Text out;
-    Text err;
-};
-
-void run_cases(const ToolFolder& folder, const std::vector<Case>& cases) {
-    for (const Case& one : cases) {
-        SCOPED_TRACE(one.arguments);
-        Outcome outcome = folder.run(one.arguments);
-        std::erase(outcome.out, '\r');
-        EXPECT_EQ(outcome.status, one.status) << outcome.err;
-        EXPECT_THAT(outcome.out, one.out);
-        EXPECT_THAT(outcome.err, one.err);
-    }
-}
 
 TEST(Tool, TellsWhatFilesHold) {
     const ToolFolder folder;

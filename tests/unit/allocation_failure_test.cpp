@@ -23,6 +23,7 @@
 #include "refhost/refhost.h"
 #include "serialize/custom_data.h"
 #include "tests/support/image_probes.h"
+#include "tests/support/record.h"
 
 namespace {
 
@@ -293,6 +294,42 @@ TEST_F(AllocationFailureTest, CustomDataStaysWithImageAndHost) {
             held = (*keys)->elements[1];
         });
     dispose_keys();
+}
+
+TEST_F(AllocationFailureTest, FlatteningAndRebuildingLeaveImageAndString) {
+    ImageHandle source = nullptr;
+    ASSERT_EQ(NewNamedImage(ZQ_TYPE_SGL, 7, 3, 1, "source", 0, &source), 0);
+    const LockedImage locked(source);
+    zqtest::fill(*locked);
+    CustomData::write(*locked, "key", std::vector<std::uint8_t>(40, 1));
+    for (const int32_t codec : {0, 1, 2}) {
+        SCOPED_TRACE(codec);
+        refhost::String record;
+        const auto flatten = [&](ZqStringHandle* string) {
+            return FlattenImageToArray1D2(source, string, 2, codec, 1, 500, 1, -1);
+        };
+        ASSERT_EQ(flatten(record.out()), 0);
+        zqtest::Record other(record.text());
+        other.name = "other";
+        other.attachment = "an object of nobody's class";
+        const refhost::String bytes(other.bytes());
+        ZqStringHandle string = nullptr;
+        // Properties that find no memory are left out.
+        check(
+            "flatten", [&] { return flatten(&string); },
+            [&] { refhost::dispose(std::exchange(string, nullptr)); }, 8);
+        ImageHandle made = nullptr;
+        check(
+            "new image", [&] { return UnflattenImageFromArray1D(&made, bytes.get()); },
+            [&] { dispose_image(std::exchange(made, nullptr)); });
+        check(
+            "into an image", [&] { return UnflattenImageFromArray1D(&target, bytes.get()); },
+            [&] {
+                image().attachments().clear();
+                image().reinitialise({ZQ_TYPE_I16, 9, 5, 2});
+                zqtest::fill(image());
+            });
+    }
 }
 
 TEST_F(AllocationFailureTest, OtherRequestsLeaveTheImage) {

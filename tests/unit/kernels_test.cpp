@@ -1,18 +1,21 @@
 // Fast rows against the obvious loops, for every target that this processor runs.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <random>
 #include <vector>
 
 #include "kernels/colour_rows.h"
 #include "kernels/colour_rows_scalar.h"
+#include "kernels/pack_bits.h"
 #include "support/simd_targets.h"
 
 namespace zq {
 namespace {
 
+constexpr std::uint8_t kGuard = 0xA5;
+
 TEST(Kernels, ColourRowsEqualThePlainLoopAndStayInside) {
-    constexpr std::uint8_t kGuard = 0xA5;
     std::mt19937 random(3);
     zqtest::on_every_simd_target([&] {
         for (std::size_t pixels = 0; pixels <= 200; ++pixels) {
@@ -23,6 +26,34 @@ TEST(Kernels, ColourRowsEqualThePlainLoopAndStayInside) {
             scalar::rgb_to_bgra(source.data(), expected.data() + 1, pixels);
             rgb_to_bgra(source.data(), actual.data() + 1, pixels);
             ASSERT_EQ(actual, expected) << pixels << " pixels";
+        }
+    });
+}
+
+TEST(Kernels, BitsOfRowsOfEveryLengthAndByte) {
+    std::mt19937 random(4);
+    zqtest::on_every_simd_target([&] {
+        for (std::size_t pixels = 0; pixels <= 600; ++pixels) {
+            std::vector<std::uint8_t> source(pixels);
+            for (auto& byte : source)
+                byte = random() % 2 == 0 ? 0 : static_cast<std::uint8_t>(random());
+            std::vector<std::uint8_t> bits((pixels + 7) / 8, 0);
+            std::vector<std::uint8_t> rows(pixels + 2, kGuard);
+            for (std::size_t i = 0; i < pixels; ++i) {
+                if (source[i] == 0) continue;
+                bits[i / 8] = static_cast<std::uint8_t>(bits[i / 8] | 1U << (i % 8));
+            }
+            // One byte off any alignment, with a guard on both sides.
+            std::vector<std::uint8_t> packed(bits.size() + 2, kGuard);
+            std::vector<std::uint8_t> expected = packed;
+            std::copy(bits.begin(), bits.end(), expected.begin() + 1);
+            pack_bits(source.data(), packed.data() + 1, pixels);
+            ASSERT_EQ(packed, expected) << pixels << " pixels";
+            expected = rows;
+            for (std::size_t i = 0; i < pixels; ++i) expected[i + 1] = source[i] == 0 ? 0 : 255;
+            // Exactly as many bytes as the row has, so that a sanitizer sees a read beyond it.
+            unpack_bits(bits.data(), rows.data() + 1, pixels);
+            ASSERT_EQ(rows, expected) << pixels << " pixels";
         }
     });
 }

@@ -5,7 +5,6 @@
 #include <algorithm>
 #include <array>
 #include <charconv>
-#include <cstdio>
 #include <limits>
 #include <memory>
 #include <optional>
@@ -15,7 +14,7 @@
 #include "batch.h"
 #include "commands.h"
 #include "failure.h"
-#include "formats.h"
+#include "output_file.h"
 #include "picture.h"
 #include "streams.h"
 
@@ -23,8 +22,7 @@ namespace {
 
 struct Options {
     std::string file;
-    std::string output;
-    std::string format;
+    OutputFile output;
     std::string size;
     uint32_t pattern = 0;
     uint32_t bits = 8;
@@ -46,36 +44,10 @@ std::optional<Size> parse_size(std::string_view text) {
     return size;
 }
 
-const Format& output_format(const Options& options) {
-    const Format* format =
-        options.format.empty() ? format_of_path(options.output) : find_format(options.format);
-    if (format == nullptr)
-        throw CLI::ValidationError(options.output +
-                                   ": the extension names no file type; use --format");
-    return *format;
-}
-
 bool is_gain(std::string_view text) {
     double gain = -1;
     const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), gain);
     return error == std::errc() && end == text.data() + text.size() && gain >= 0 && gain < 3.999;
-}
-
-// Memory grows with what the file holds, not with what it is said to hold.
-std::vector<uint8_t> read_bytes(const std::string& path, size_t count) {
-    constexpr size_t kAtOnce = size_t{1} << 20;
-    const std::unique_ptr<std::FILE, int (*)(std::FILE*)> file(std::fopen(path.c_str(), "rb"),
-                                                               std::fclose);
-    if (file == nullptr) fail_with_errno({});
-    std::vector<uint8_t> bytes;
-    while (bytes.size() < count) {
-        const size_t done = bytes.size(), wanted = std::min(count - done, kAtOnce);
-        bytes.resize(done + wanted);
-        if (std::fread(bytes.data() + done, 1, wanted, file.get()) == wanted) continue;
-        if (std::ferror(file.get()) != 0) fail_with_errno({});
-        throw Failure(ZQ_ERR_UNABLE_TO_READ_DATA);
-    }
-    return bytes;
 }
 
 class Mosaic {
@@ -88,6 +60,7 @@ class Mosaic {
         if (count > std::numeric_limits<ptrdiff_t>::max() / 2)
             throw Failure(ZQ_ERR_NOT_ENOUGH_MEMORY);
         bytes_ = read_bytes(path, static_cast<size_t>(count));
+        if (bytes_.size() < count) throw Failure(ZQ_ERR_UNABLE_TO_READ_DATA);
         if (size.height == 1) bytes_.insert(bytes_.end(), bytes_.begin(), bytes_.end());
         if (sample_bytes_ == 1) return;
         words_.resize(bytes_.size() / 2);
@@ -125,15 +98,13 @@ void decode(const Mosaic& mosaic, const Options& options, const Picture& picture
 }
 
 int run(const Options& options, bool quiet) {
-    const Format& format = output_format(options);
+    format_of(options.output);  // wrong usage, before anything is done
     return run_batch({options.file}, quiet, [&](const std::string& file) {
         const Input input(file);
         const Mosaic mosaic(input.path(), parse_size(options.size).value(), options.bits);
         Picture picture(ZQ_TYPE_RGB, mosaic.size().width, mosaic.size().height);
         decode(mosaic, options, picture);
-        write_through_path(options.output, [&](const std::string& path) {
-            check(picture.write(path, format.name, {}), name_for_reports(options.output));
-        });
+        write_picture(picture, options.output);
         return std::string();
     });
 }
@@ -149,11 +120,7 @@ void add_bayer(CLI::App& tool, Session& session) {
                      "Samples, row after row, unpadded: bytes, or little-endian 16-bit words for "
                      "more than 8 bits; - is standard input")
         ->required();
-    command->add_option("-o,--output", options->output, "Output file; - is standard output")
-        ->required();
-    command
-        ->add_option("--format", options->format, "Type of file; without it the extension decides")
-        ->transform(CLI::IsMember(format_names(), CLI::ignore_case));
+    add_output_option(*command, options->output);
     command->add_option("--size", options->size, "WIDTHxHEIGHT in pixels")
         ->required()
         ->check([](const std::string& text) {

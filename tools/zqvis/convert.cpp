@@ -12,6 +12,7 @@
 #include "commands.h"
 #include "failure.h"
 #include "formats.h"
+#include "output_file.h"
 #include "picture.h"
 #include "streams.h"
 
@@ -60,10 +61,7 @@ std::vector<std::string> names_of(const Names& names) {
 const Format& output_format(const Options& options) {
     if (!options.format.empty()) return *find_format(options.format);
     if (!options.folder.empty()) refuse_usage("--out-dir needs --format");
-    const Format* format = format_of_path(options.output);
-    if (format == nullptr)
-        refuse_usage(options.output + ": the extension names no file type; use --format");
-    return *format;
+    return format_of({options.output, {}});
 }
 
 std::string output_of(const Options& options, const Format& format, const std::string& file) {
@@ -113,11 +111,8 @@ std::unique_ptr<Picture> read(const std::string& path, const Options& options,
 void convert(const std::string& file, const Options& options, const Format& format) {
     const Input input(file);
     const std::unique_ptr<Picture> picture = read(input.path(), options, format);
-    const ZqWriteOptions written = write_options(options, format.name);
-    const std::string output = output_of(options, format, file);
-    write_through_path(output, [&](const std::string& path) {
-        check(picture->write(path, format.name, written), name_for_reports(output));
-    });
+    write_picture(*picture, {output_of(options, format, file), format.name},
+                  write_options(options, format.name));
 }
 
 int run(const Options& options, bool quiet) {
@@ -152,8 +147,7 @@ void add_convert(CLI::App& tool, Session& session) {
                                   const std::vector<std::string>& names) {
         command->add_option(name, target, help)->transform(CLI::IsMember(names, CLI::ignore_case));
     };
-    one_of("--format", options->format, "Type of file; without it the extension decides",
-           format_names());
+    add_format_option(*command, options->format);
     one_of("--type", options->type, "Type of pixel", names_of(kPixelTypes));
     one_of("--tiff-compression", options->tiff_compression, "TIFF", names_of(kTiffCompressions));
     command->add_option("--quality", options->quality, "JPEG, JPEG2000")

@@ -2,6 +2,7 @@
 #include "picture.h"
 
 #include <zqvissvc/errors.h>
+#include <zqvissvc/flatten.h>
 #include <zqvissvc/image.h>
 
 #include <array>
@@ -23,6 +24,11 @@ Picture::Picture(const std::string& path) : Picture(ZQ_TYPE_U8, 0, 0) {
                      colour_table_.out()));
     file_type_ = type_name.text();
     file_type_.erase(file_type_.find_last_not_of(' ') + 1);
+}
+
+Picture::Picture(const Record& record) {
+    const refhost::String string(record.bytes);
+    check(UnflattenImageFromArray1D(&value_.image, string.get()));
 }
 
 Picture::~Picture() {
@@ -89,4 +95,13 @@ ZqError Picture::write(const std::string& path, const std::string& file_type,
                        const ZqWriteOptions& options) {
     return DF_WriteFile2(&value_, path.c_str(), file_type.c_str(), colour_table_.out(), &options,
                          nullptr);
+}
+
+std::string Picture::flattened(const Flattening& how) const {
+    constexpr int32_t kByArguments = 2;
+    constexpr int32_t kNewestVersion = -1;
+    refhost::String record;
+    check(FlattenImageToArray1D2(value_.image, record.out(), kByArguments, how.codec, how.kind,
+                                 how.quality, 1, kNewestVersion));
+    return record.text();
 }

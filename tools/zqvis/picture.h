@@ -12,6 +12,7 @@
 #include <optional>
 #include <span>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "refhost/refhost.h"
@@ -28,12 +29,26 @@ struct Facts {
     int32_t sample_offset = 0;
 };
 
+// How an image is flattened; the numbers are the library's.
+struct Flattening {
+    int32_t codec;
+    int32_t kind;
+    int32_t quality;  // counts for the quality codec alone
+};
+
+// The bytes of one flattened image.
+struct Record {
+    std::string_view bytes;
+};
+
 class Picture {
   public:
     // An image without name and border.
     Picture(int32_t type, int32_t width, int32_t height);
     // The file's image, of the type that the file holds.
     explicit Picture(const std::string& path);
+    // The flattened image.
+    explicit Picture(const Record& record);
     Picture(const Picture&) = delete;
     Picture& operator=(const Picture&) = delete;
     ~Picture();
@@ -54,6 +69,9 @@ class Picture {
     // Writes the image with its colour table; returns the library's code.
     ZqError write(const std::string& path, const std::string& file_type,
                   const ZqWriteOptions& options);
+
+    // One record, without the colour table.
+    std::string flattened(const Flattening& how) const;
 
   private:
     void copy_attributes(const Facts& from) const;

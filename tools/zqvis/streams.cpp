@@ -1,6 +1,7 @@
 // Standard streams through temporary files, and whole outputs or none.
 #include "streams.h"
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <random>
@@ -70,6 +71,24 @@ Input::Input(const std::string& name) : path_(name) {
     Stream staged = open(path_, "wb");
     copy(stdin, staged.get(), path_);
     close(std::move(staged), path_);
+}
+
+// Memory grows with what the file holds, not with what it is said to hold.
+std::vector<uint8_t> read_bytes(const std::string& path, size_t most) {
+    constexpr size_t kAtOnce = size_t{1} << 20;
+    const Stream file(std::fopen(path.c_str(), "rb"));
+    if (file == nullptr) fail_with_errno({});
+    std::vector<uint8_t> bytes;
+    while (bytes.size() < most) {
+        const size_t done = bytes.size(), wanted = std::min(most - done, kAtOnce);
+        bytes.resize(done + wanted);
+        const size_t got = std::fread(bytes.data() + done, 1, wanted, file.get());
+        if (got == wanted) continue;
+        if (std::ferror(file.get()) != 0) fail_with_errno({});
+        bytes.resize(done + got);
+        break;
+    }
+    return bytes;
 }
 
 void write_through_path(const std::string& output,

@@ -10,6 +10,7 @@
 #include <memory>
 #include <span>
 #include <string>
+#include <vector>
 
 constexpr const char* kStandardStream = "-";
 
@@ -41,6 +42,9 @@ class Input {
     std::unique_ptr<TemporaryFolder> folder_;
     std::string path_;
 };
+
+// The file's bytes, but no more than `most`. A folder or an unreadable file is a Failure.
+std::vector<uint8_t> read_bytes(const std::string& path, size_t most);
 
 // Has `write` make a file at the path that it is handed, then brings it to the output.
 void write_through_path(const std::string& output,
