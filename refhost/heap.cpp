@@ -6,7 +6,6 @@
 #include <cstring>
 #include <limits>
 #include <memory>
-#include <new>
 #include <utility>
 
 #if __has_include(<sanitizer/asan_interface.h>)
@@ -29,9 +28,7 @@ using Memory = std::unique_ptr<void, Free>;
 constexpr int kFreshByte = 0xCD;
 constexpr uint8_t kStaleByte = 0xDD;
 constexpr size_t kCountBytes = sizeof(int32_t);  // in front of the elements of a string or array
-constexpr size_t kMaxRelics = 1024;
 constexpr size_t kMaxRelicBytes = 32u << 20;
-constexpr size_t kMaxRetired = 4096;
 
 // The range of the services' 32-bit sizes.
 bool is_size(int64_t size) {
@@ -41,17 +38,6 @@ bool is_size(int64_t size) {
 std::string describe(const char* what, size_t size, uint64_t number) {
     return std::string(what) + " of " + std::to_string(size) + " bytes (allocation " +
            std::to_string(number) + ")";
-}
-
-// Disposing never fails for want of memory; what can not be remembered is given up at once.
-template <class Queue>
-bool remember(Queue& queue, const typename Queue::value_type& value) {
-    try {
-        queue.push_back(value);
-        return true;
-    } catch (const std::bad_alloc&) {
-        return false;
-    }
 }
 
 const char* pool_name(Pool pool) {
@@ -91,8 +77,7 @@ ZqHandle Heap::make(Pool pool, int64_t size) {
 Heap::Entry* Heap::find(Pool pool, ZqHandle handle, const char* service) {
     const auto found = handles_.find(handle);
     if (found == handles_.end()) {
-        const bool retired = std::find(retired_.begin(), retired_.end(), handle) != retired_.end();
-        if (retired)
+        if (is_retired(handle))
             note(&Report::stale_uses, std::string(service) + ": a disposed handle");
         else
             note(&Report::foreign_uses, std::string(service) + ": not a handle");
@@ -103,6 +88,10 @@ Heap::Entry* Heap::find(Pool pool, ZqHandle handle, const char* service) {
         return nullptr;
     }
     return &found->second;
+}
+
+bool Heap::is_retired(ZqHandle handle) const {
+    return retired_.any_of([handle](ZqHandle retired) { return retired == handle; });
 }
 
 int32_t Heap::resize(Pool pool, ZqHandle handle, int64_t size, const char* service) {
@@ -126,7 +115,7 @@ int32_t Heap::resize(Pool pool, ZqHandle handle, int64_t size, const char* servi
 }
 
 int32_t Heap::dispose(Pool pool, ZqHandle handle, const char* service) {
-    if (std::find(retired_.begin(), retired_.end(), handle) != retired_.end()) {
+    if (is_retired(handle)) {
         note(&Report::double_frees, std::string(service) + ": a handle that was disposed before");
         return kBadArgument;
     }
@@ -135,7 +124,7 @@ int32_t Heap::dispose(Pool pool, ZqHandle handle, const char* service) {
     retire(*handle, *entry);
     *handle = nullptr;
     handles_.erase(handle);
-    if (!remember(retired_, handle)) std::free(handle);
+    retired_.push_back(handle);
     if (retired_.size() > kMaxRetired) {
         std::free(retired_.front());
         retired_.pop_front();
@@ -207,7 +196,7 @@ int32_t Heap::dispose_block(void* block, const char* service) {
     const auto found = blocks_.find(block);
     if (found == blocks_.end()) {
         const auto is_block = [block](const Relic& relic) { return relic.address == block; };
-        const bool relic = std::any_of(relics_.begin(), relics_.end(), is_block);
+        const bool relic = relics_.any_of(is_block);
         note(relic ? &Report::double_frees : &Report::foreign_uses,
              std::string(service) + ": not a live block");
         return kBadArgument;
@@ -219,10 +208,11 @@ int32_t Heap::dispose_block(void* block, const char* service) {
 }
 
 void Heap::retire(void* address, const Entry& entry) {
-    if (!strict_ || !remember(relics_, {address, entry.size, entry.number})) {
+    if (!strict_) {
         std::free(address);
         return;
     }
+    relics_.push_back({address, entry.size, entry.number});
     std::memset(address, kStaleByte, entry.size);
     ASAN_POISON_MEMORY_REGION(address, entry.size);
     relic_bytes_ += entry.size;

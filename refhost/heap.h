@@ -5,8 +5,9 @@
 
 #include <zqvissvc/types.h>
 
+#include <array>
+#include <cstddef>
 #include <cstdint>
-#include <deque>
 #include <string>
 #include <string_view>
 #include <unordered_map>
@@ -15,6 +16,33 @@
 #include "service.h"
 
 namespace refhost {
+
+// A queue with room of its own, so that disposing never fails for want of memory. The caller pops
+// before it is full.
+template <class Item, size_t kRoom>
+class Ring {
+  public:
+    void push_back(const Item& item) { items_[(first_ + count_++) % kRoom] = item; }
+    const Item& front() const { return items_[first_]; }
+    void pop_front() {
+        first_ = (first_ + 1) % kRoom;
+        --count_;
+    }
+    size_t size() const { return count_; }
+    bool empty() const { return count_ == 0; }
+    template <class Predicate>
+    bool any_of(Predicate holds) const {
+        for (size_t i = 0; i < count_; ++i) {
+            if (holds(items_[(first_ + i) % kRoom])) return true;
+        }
+        return false;
+    }
+
+  private:
+    std::array<Item, kRoom> items_{};
+    size_t first_ = 0;
+    size_t count_ = 0;
+};
 
 enum class Pool { kApplication, kData };  // the AZ and the DS heap
 
@@ -66,13 +94,18 @@ class Heap {
     Entry* find(Pool pool, ZqHandle handle, const char* service);
     void note(size_t Report::*count, const std::string& line);
 
+    static constexpr size_t kMaxRetired = 4096;
+    static constexpr size_t kMaxRelics = 1024;
+
+    bool is_retired(ZqHandle handle) const;
+
     bool strict_ = false;
     uint64_t allocations_ = 0;
     std::unordered_map<const void*, Entry> handles_;
     std::unordered_map<const void*, Entry> blocks_;
     // Disposed handles and blocks left behind: their addresses are not given out again for a while.
-    std::deque<ZqHandle> retired_;
-    std::deque<Relic> relics_;
+    Ring<ZqHandle, kMaxRetired + 1> retired_;
+    Ring<Relic, kMaxRelics + 1> relics_;
     size_t relic_bytes_ = 0;
     Report report_;
 };

@@ -74,6 +74,20 @@ std::span<std::uint8_t> Image::whole_rows() const {
             static_cast<std::size_t>((rows - 1) * row_stride() + last_row)};
 }
 
+void Image::clear_padding() const {
+    const std::span<std::uint8_t> rows = whole_rows();
+    const auto stride = static_cast<std::size_t>(row_stride());
+    const auto used =
+        (static_cast<std::size_t>(record_.width) + 2 * static_cast<std::size_t>(record_.border)) *
+        static_cast<std::size_t>(bytes_per_pixel(type()));
+    if (source_ == BufferSource::kExternal || used >= stride) {
+        return;
+    }
+    for (std::size_t start = used; start < rows.size(); start += stride) {
+        std::memset(rows.data() + start, 0, stride - used);
+    }
+}
+
 std::uint8_t* Image::lend() {
     if (external_count_ == std::numeric_limits<std::int32_t>::max()) {
         throw kSystemError;

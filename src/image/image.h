@@ -106,6 +106,8 @@ class Image final : public Object {
     // rows, except that an external buffer may end with the last pixel of its last row. Empty
     // without pixels.
     std::span<std::uint8_t> whole_rows() const;
+    // Makes the padding behind each row zeros; that of an external buffer stays its owner's.
+    void clear_padding() const;
 
     // Lending. lend returns the start of the buffer; give_back lowers the count, which never falls
     // below 0.

@@ -1,12 +1,14 @@
 // References to images in 32 bits.
 #include "serialize/image_reference.h"
 
-#include <chrono>
+#include <ctime>
+#include <memory>
 #include <mutex>
 #include <unordered_map>
 
 #include "image/lifecycle.h"
 #include "platform/mutex.h"
+#include "platform/thread.h"
 
 namespace zq {
 
@@ -17,12 +19,12 @@ constexpr bool kHandleFits = sizeof(ImageHandle) == sizeof(std::uint32_t);
 // Where the tokens of a process begin: elsewhere than those of others, since the names of rebuilt
 // images come from them and records outlive the process.
 std::uint32_t first_token() {
-    static const char place = 0;  // its address differs from process to process
-    const auto now = std::chrono::system_clock::now().time_since_epoch().count();
-    const auto mixed =
-        (static_cast<std::uint64_t>(now) ^ reinterpret_cast<std::uintptr_t>(&place)) *
-        0x9E3779B97F4A7C15U;
-    return static_cast<std::uint32_t>(mixed >> 32);
+    const auto place = std::make_unique<char>();  // addresses differ from process to process
+    const std::uint64_t mixed = static_cast<std::uint64_t>(std::time(nullptr)) << 20U ^
+                                static_cast<std::uint64_t>(std::clock()) << 10U ^
+                                platform::current_thread() ^
+                                reinterpret_cast<std::uintptr_t>(place.get());
+    return static_cast<std::uint32_t>(mixed * 0x9E3779B97F4A7C15U >> 32);
 }
 
 struct Tokens {

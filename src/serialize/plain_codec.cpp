@@ -24,6 +24,8 @@ class PlainCodec final : public PixelCodec {
         if (record.rowPixels < record.width + 2 * std::int64_t{record.border}) {
             throw kInitializationError;
         }
+        // What was in the memory before is nobody's business elsewhere.
+        image.clear_padding();
         const auto row_count =
             static_cast<std::size_t>(record.height) + 2 * static_cast<std::size_t>(record.border);
         context.borrow_pixels(
