@@ -36,7 +36,8 @@ class PackedCodec final : public PixelCodec {
         context.words.type = static_cast<std::uint32_t>(PixelType::kU8);
     }
 
-    void decode(Image& image, const ZqFlattenContext& context) const override {
+    void decode(Image& image, const ZqFlattenContext& context,
+                PixelMemory /*memory*/) const override {
         const auto block = block_bytes(context.pixelBlock, context.pixelBlockSize);
         const std::size_t row_bytes = packed_row_bytes(context.width);
         for (std::int32_t y = 0; y < image.record().height; ++y) {

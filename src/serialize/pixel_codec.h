@@ -6,6 +6,7 @@
 
 #include "image/image.h"
 #include "serialize/flatten_context.h"
+#include "serialize/pixel_memory.h"
 
 namespace zq {
 
@@ -26,7 +27,8 @@ class PixelCodec {
 
     // Writes the pixels of an image that has the context's type, size and border. Trap: the context
     // has been found good by check().
-    virtual void decode(Image& image, const ZqFlattenContext& context) const = 0;
+    virtual void decode(Image& image, const ZqFlattenContext& context,
+                        PixelMemory memory) const = 0;
 
     // Reads, or with `set` stores, the quality.
     virtual void quality(std::int32_t& value, bool set) = 0;

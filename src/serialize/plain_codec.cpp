@@ -35,7 +35,8 @@ class PlainCodec final : public PixelCodec {
     // Between images of different line widths the strides are pixel counts taken as bytes: exact
     // for pixels of one byte only. Readers and writers of all versions agree on that; do not widen
     // it.
-    void decode(Image& image, const ZqFlattenContext& context) const override {
+    void decode(Image& image, const ZqFlattenContext& context,
+                PixelMemory /*memory*/) const override {
         const auto from = block_bytes(context.pixelBlock, context.pixelBlockSize);
         const std::span<std::uint8_t> to = image.whole_rows();
         const auto to_line = static_cast<std::size_t>(image.record().rowPixels);

@@ -126,14 +126,14 @@ std::vector<std::uint8_t> compress_pixels(const Image& image, int quality) {
     return block;
 }
 
-void decompress_pixels(Image& image, std::span<const std::uint8_t> block) {
+void decompress_pixels(Image& image, std::span<const std::uint8_t> block, PixelMemory memory) {
     StreamReader reader(checked_payload(image, block));
     if (!has_pixels(image)) {
         reader.expect_end();
         return;
     }
     if (is_jpeg_type(image.type())) {
-        read_jpeg(reader, image);
+        read_jpeg(reader, image, memory);
     } else {
         read_planes_of(reader, image);
     }

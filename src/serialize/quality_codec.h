@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "image/image.h"
+#include "serialize/pixel_memory.h"
 
 namespace zq {
 
@@ -22,6 +23,7 @@ std::vector<std::uint8_t> compress_pixels(const Image& image, int quality);
 // Writes the image's pixels, and its border as copies of the nearest pixel of the image proper.
 // Throws kInitializationError for a block that is damaged or that is not one of an image of this
 // type and size, kNotEnoughMemory, std::bad_alloc; the image is unchanged then.
-void decompress_pixels(Image& image, std::span<const std::uint8_t> block);
+void decompress_pixels(Image& image, std::span<const std::uint8_t> block,
+                       PixelMemory memory = PixelMemory::kUsed);
 
 }  // namespace zq

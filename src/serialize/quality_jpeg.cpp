@@ -229,7 +229,7 @@ void put_jpeg(Bytes& out, const Image& image, int quality) {
 
 // A tile that is refused is refused before its first row. So one tile can go straight to the image,
 // while several go through a picture of their own.
-void read_jpeg(StreamReader& reader, Image& image) {
+void read_jpeg(StreamReader& reader, Image& image, PixelMemory memory) {
     const ImageRecord& record = image.record();
     std::vector<std::span<const std::uint8_t>> streams;
     for_each_tile(image, [&](const PixelTile&) { streams.push_back(reader.section()); });
@@ -239,7 +239,9 @@ void read_jpeg(StreamReader& reader, Image& image) {
         const auto width = static_cast<std::size_t>(record.width);
         const auto height = static_cast<std::size_t>(record.height);
         plane = read_lossless(reader, width, height, 1);
-        between = std::make_unique<AlphaRow>(plane, record.width, stores_for(4 * width * height));
+        const Stores stores =
+            memory == PixelMemory::kFresh ? Stores::kCached : stores_for(4 * width * height);
+        between = std::make_unique<AlphaRow>(plane, record.width, stores);
     }
     reader.expect_end();
     if (is_one_tile(image)) {

@@ -5,6 +5,7 @@
 #include <span>
 
 #include "image/image.h"
+#include "serialize/pixel_memory.h"
 #include "serialize/quality_stream.h"
 
 namespace zq {
@@ -13,6 +14,6 @@ namespace zq {
 void put_jpeg(Bytes& out, const Image& image, int quality);
 
 // Throws kInitializationError, kNotEnoughMemory, std::bad_alloc; the image is unchanged then.
-void read_jpeg(StreamReader& reader, Image& image);
+void read_jpeg(StreamReader& reader, Image& image, PixelMemory memory);
 
 }  // namespace zq

@@ -18,8 +18,8 @@ class QualityCodec final : public PixelCodec {
         context.own_pixels(compress_pixels(image, quality_ / 10));
     }
 
-    void decode(Image& image, const ZqFlattenContext& context) const override {
-        decompress_pixels(image, block_bytes(context.pixelBlock, context.pixelBlockSize));
+    void decode(Image& image, const ZqFlattenContext& context, PixelMemory memory) const override {
+        decompress_pixels(image, block_bytes(context.pixelBlock, context.pixelBlockSize), memory);
     }
 
     void quality(std::int32_t& value, bool set) override {

@@ -98,7 +98,7 @@ class Rebuilding {
         if (decoded_aside_ != nullptr) return;
         auto aside = std::make_unique<Image>(Variant::kPrivate, std::string_view());
         aside->reinitialise(shape_);
-        codec_->decode(*aside, context_);
+        codec_->decode(*aside, context_, PixelMemory::kFresh);
         decoded_aside_ = std::move(aside);
     }
 
@@ -124,9 +124,9 @@ class Rebuilding {
     void write_pixels(Image& image) {
         if (!may_fail_late()) {
             image.resize(shape_);
-            if (codec_ != nullptr) codec_->decode(image, context_);
+            if (codec_ != nullptr) codec_->decode(image, context_, PixelMemory::kUsed);
         } else if (has_shape(image)) {
-            codec_->decode(image, context_);
+            codec_->decode(image, context_, PixelMemory::kUsed);
         } else {
             decode_aside();
             if (has_bit_depth(decoded_aside_->type())) {
