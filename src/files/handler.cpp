@@ -46,17 +46,29 @@ GRLIBError_enum ImageFileHandler::read(InputFile& file, Image& target, const Acc
 bool ImageFileHandler::read_steps(Image& target, const Accept& accept) {
     if (!read_header()) return false;
     seek_to_data();
-    const FileContents contents{type_name(), header_.pixel_format, read_colour_table()};
+    read_pixels(target, accept, {type_name(), header_.pixel_format, read_colour_table()});
+    set_calibration(target);
+    return true;
+}
+
+void ImageFileHandler::read_pixels(Image& target, const Accept& accept,
+                                   const FileContents& contents) {
     const Extent shape{header_.type, header_.width, header_.height, target.extent().border};
     if (!may_read_in_place() || shape != target.extent()) {
         read_through_staging(target, accept, contents);
-        return true;
+        return;
     }
     accept(contents);
     read_lines(target);
     target.set_bit_depth(header_.bit_depth);
     target.set_sample_offset(0);
-    return true;
+}
+
+void ImageFileHandler::set_calibration(Image& target) const {
+    if (!header_.calibration) return;
+    target.record().unit = header_.calibration->unit;
+    target.record().xStep = header_.calibration->x_step;
+    target.record().yStep = header_.calibration->y_step;
 }
 
 void ImageFileHandler::read_through_staging(Image& target, const Accept& accept,

@@ -55,14 +55,16 @@ class ImageFileHandler {
         PixelType type = PixelType::kU8;
         std::int32_t width = 0;
         std::int32_t height = 0;
-        std::int32_t bits_per_pixel = 0;  // in the file
-        std::int32_t bit_depth = 0;       // attribute of the image; 0: none
+        std::int32_t bits_per_pixel = 0;           // in the file
+        std::int32_t bit_depth = 0;                // attribute of the image; 0: none
+        std::optional<Calibration> calibration{};  // none: the target keeps its own
 
         // In the file; a broken byte at the end is cut off.
         std::size_t bytes_per_line() const;
     };
 
-    // Reading, in this order. read_header fills header_; false: not a file of this type.
+    // Reading, in this order. read_header fills header_; false: not a file of this type. The
+    // calibration may also be filled later, in read_lines.
     virtual bool read_header() = 0;
     virtual void seek_to_data() {}
     virtual std::vector<std::uint32_t> read_colour_table() { return {}; }
@@ -90,7 +92,9 @@ class ImageFileHandler {
   private:
     bool read_steps(Image& target, const Accept& accept);
     void write_steps(const char* path);
+    void read_pixels(Image& target, const Accept& accept, const FileContents& contents);
     void read_through_staging(Image& target, const Accept& accept, const FileContents& contents);
+    void set_calibration(Image& target) const;
 
     std::int32_t type_code_;
     unsigned name_id_;

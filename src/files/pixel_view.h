@@ -16,6 +16,13 @@ enum class Packing : std::int32_t {
     kPacked24 = 4,    // kRgb only: blue, green, red bytes without the fourth
 };
 
+// What a pixel measures.
+struct Calibration {
+    std::int32_t unit = 0;  // code of the image record
+    float x_step = 1.0F;
+    float y_step = 1.0F;
+};
+
 struct PixelView {
     PixelType type = PixelType::kU8;
     Packing packing = Packing::kNative;
@@ -25,6 +32,7 @@ struct PixelView {
     std::ptrdiff_t stride = 0;  // bytes from one row to the next
     std::int32_t bit_depth = 0;
     std::int32_t sample_offset = 0;  // value = sample + offset, as the image was read
+    Calibration calibration{};
 
     const std::uint8_t* row(std::int32_t y) const { return first + y * stride; }
 };
@@ -39,7 +47,8 @@ inline PixelView view_of(const Image& image) {
             .first = record.firstPixel,
             .stride = image.row_stride(),
             .bit_depth = image.bit_depth(),
-            .sample_offset = image.sample_offset()};
+            .sample_offset = image.sample_offset(),
+            .calibration = {record.unit, record.xStep, record.yStep}};
 }
 
 }  // namespace zq
