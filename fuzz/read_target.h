@@ -58,7 +58,7 @@ inline std::string state_of(const zq::Image& image) {
 
 inline GRLIBError_enum read(const char* path, zq::Image& target, zq::FileContents& contents) {
     try {
-        zq::read_file(path, target, false, [&](const zq::FileContents& c) { contents = c; });
+        zq::read_file(path, target, nullptr, [&](const zq::FileContents& c) { contents = c; });
         return kSuccess;
     } catch (GRLIBError_enum code) {
         return code;

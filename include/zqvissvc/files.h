@@ -36,7 +36,15 @@ typedef struct ZqWriteOptions {
     int32_t words[3];
 } ZqWriteOptions;
 
-/* How to read a file without a header, as seven words. */
+/* How to read a file without a header (type code 5, "RAW"), as seven words. The picture has the
+ * size of the image that it is read into. format  0 to 3 grey of 1, 2, 4, 8 bits (the first pixel
+ * in the highest bits; few bits are spread over the whole range); 4 unsigned and 5 signed grey of
+ * 16 bits (I16); 6 colour of 5, 6, 5 bits; 7 red, green, blue bytes; 8 the same as three planes,
+ * each a third of the data; 9 unsigned and 10 signed integers of 32 bits (Float); 11 RGB, 13 48-bit
+ * colour, 15 HSL as images hold them, blue or luminance first; 12 float; 14 complex. Others:
+ * -1074396000. layoutMode  2: layout[0] is the bytes from one line to the next (0: no gap; below a
+ * line -1074395997), layout[1] not 0 means that the last line comes first. Not for planes.
+ * byteOrder  of samples of more than a byte. */
 typedef struct ZqRawParameters {
     int32_t present; /* not 0: the file is read by these parameters and not probed */
     int32_t format;
@@ -107,7 +115,8 @@ ZQ_API ZqError ZQ_CALL ZqWriteFileByCode(const char* path, ZqImageHandle image,
  * come through with all samples moved down by 32768 (see ZqGetSampleOffset), and a write gives the
  * file's samples back.
  * path         borrowed; empty or null: -1074395989.
- * raw          borrowed; may be null. With parameters present: -1074395991.
+ * raw          borrowed; may be null. With parameters present the file is read by them:
+ *              -1074396074 for an image without pixels.
  * typeName     written unless null: the type's name, padded with blanks to 8 characters; "xxx" when
  *              nobody recognises the file.
  * pixelFormat  written unless null: how the file holds its pixels: 0, 1, 2, 3 grey or indices of 1,

@@ -33,17 +33,17 @@ void write_image(const char* path, ZqImageHandle handle, const ZqWriteOptions* o
                 .colour_table = host::view(table == nullptr ? nullptr : *table)});
 }
 
-void read_image(ZqImageHandle handle, const char* path, bool headerless, ZqStringHandle* type_name,
-                std::int32_t* pixel_format, ZqArrayU32Handle* table) {
+void read_image(ZqImageHandle handle, const char* path, const ZqRawParameters* raw,
+                ZqStringHandle* type_name, std::int32_t* pixel_format, ZqArrayU32Handle* table) {
     const LockedImage image(handle);
     try {
-        read_file(path, *image, headerless, [&](const FileContents& contents) {
+        read_file(path, *image, raw, [&](const FileContents& contents) {
             if (type_name != nullptr) host::set_string(type_name, contents.type_name);
             if (table != nullptr) host::set_array(table, contents.colour_table);
             put(pixel_format, static_cast<std::int32_t>(contents.pixel_format));
         });
     } catch (GRLIBError_enum code) {
-        if (code == kUnsupportedFileType && !headerless && type_name != nullptr) {
+        if (code == kUnsupportedFileType && raw == nullptr && type_name != nullptr) {
             host::set_string(type_name, "xxx");
         }
         throw;
@@ -77,7 +77,7 @@ ZqError ZQ_CALL ZqReadFile(ZqImageHandle image, const char* path, const ZqRawPar
                            ZqArrayU32Handle* colourTable) {
     return host::run_core([&] {
         const bool headerless = raw != nullptr && raw->present != 0;
-        read_image(image, path, headerless, typeName, pixelFormat, colourTable);
+        read_image(image, path, headerless ? raw : nullptr, typeName, pixelFormat, colourTable);
     });
 }
 

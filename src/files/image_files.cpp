@@ -3,6 +3,7 @@
 
 #include "files/code_of.h"
 #include "files/handlers.h"
+#include "files/raw_handler.h"
 
 namespace zq {
 
@@ -30,11 +31,15 @@ void write_file(const char* path, std::int32_t type_code, const WriteJob& job) {
     write_as(path, type_code, job);
 }
 
-void read_file(const char* path, Image& target, bool headerless, const Accept& accept) {
+void read_file(const char* path, Image& target, const ZqRawParameters* raw, const Accept& accept) {
     if (is_empty(path)) throw kUnableToReadData;
     InputFile file(path);
-    if (headerless) throw kUnsupportedFileType;
-    read_file(file, target, accept);
+    if (raw == nullptr) {
+        read_file(file, target, accept);
+        return;
+    }
+    bool recognised = false;
+    throw_if_failed(RawFileHandler(*raw, target.extent()).read(file, target, accept, recognised));
 }
 
 void read_file(InputFile& file, Image& target, const Accept& accept) {

@@ -7,7 +7,6 @@
 #include <charconv>
 #include <limits>
 #include <memory>
-#include <optional>
 #include <string_view>
 #include <vector>
 
@@ -16,6 +15,7 @@
 #include "failure.h"
 #include "output_file.h"
 #include "picture.h"
+#include "size.h"
 #include "streams.h"
 
 namespace {
@@ -28,21 +28,6 @@ struct Options {
     uint32_t bits = 8;
     std::vector<double> gains = {1, 1, 1};
 };
-
-struct Size {
-    int32_t width, height;
-};
-
-std::optional<Size> parse_size(std::string_view text) {
-    Size size = {};
-    const char* const end = text.data() + text.size();
-    const auto width = std::from_chars(text.data(), end, size.width);
-    if (width.ec != std::errc() || width.ptr == end || *width.ptr != 'x') return std::nullopt;
-    const auto height = std::from_chars(width.ptr + 1, end, size.height);
-    if (height.ec != std::errc() || height.ptr != end) return std::nullopt;
-    if (size.width < 1 || size.height < 1) return std::nullopt;
-    return size;
-}
 
 bool is_gain(std::string_view text) {
     double gain = -1;
@@ -101,7 +86,7 @@ int run(const Options& options, bool quiet) {
     format_of(options.output);  // wrong usage, before anything is done
     return run_batch({options.file}, quiet, [&](const std::string& file) {
         const Input input(file);
-        const Mosaic mosaic(input.path(), parse_size(options.size).value(), options.bits);
+        const Mosaic mosaic(input.path(), to_size(options.size), options.bits);
         Picture picture(ZQ_TYPE_RGB, mosaic.size().width, mosaic.size().height);
         decode(mosaic, options, picture);
         write_picture(picture, options.output);
@@ -121,11 +106,7 @@ void add_bayer(CLI::App& tool, Session& session) {
                      "more than 8 bits; - is standard input")
         ->required();
     add_output_option(*command, options->output);
-    command->add_option("--size", options->size, "WIDTHxHEIGHT in pixels")
-        ->required()
-        ->check([](const std::string& text) {
-            return parse_size(text) ? std::string() : text + " is no size";
-        });
+    add_size_option(*command, options->size);
     command
         ->add_option("--pattern", options->pattern,
                      "First two colours of rows 0 and 1: 0 GB RG, 1 GR BG, 2 BG GR, 3 RG GB")

@@ -15,6 +15,7 @@ void add_info(CLI::App& tool, Session& session);
 void add_convert(CLI::App& tool, Session& session);
 void add_dump(CLI::App& tool, Session& session);
 void add_bayer(CLI::App& tool, Session& session);
+void add_raw(CLI::App& tool, Session& session);
 void add_flatten(CLI::App& tool, Session& session);
 void add_unflatten(CLI::App& tool, Session& session);
 void add_error(CLI::App& tool, Session& session);

@@ -21,6 +21,7 @@ int run(int argc, char** argv) {
     add_convert(tool, session);
     add_dump(tool, session);
     add_bayer(tool, session);
+    add_raw(tool, session);
     add_flatten(tool, session);
     add_unflatten(tool, session);
     add_error(tool, session);

@@ -31,6 +31,10 @@ Picture::Picture(const Record& record) {
     check(UnflattenImageFromArray1D(&value_.image, string.get()));
 }
 
+void Picture::read_raw(const std::string& path, const ZqRawParameters& raw) {
+    check(ZqReadFile(value_.image, path.c_str(), &raw, nullptr, nullptr, nullptr));
+}
+
 Picture::~Picture() {
     DF_Dispose(&value_, 0, nullptr);
     refhost::dispose(value_.name);

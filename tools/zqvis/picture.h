@@ -53,6 +53,9 @@ class Picture {
     Picture& operator=(const Picture&) = delete;
     ~Picture();
 
+    // Replaces the picture by the pixels of a file without a header, in the same size.
+    void read_raw(const std::string& path, const ZqRawParameters& raw);
+
     Facts facts() const;
     const std::string& file_type() const { return file_type_; }  // empty unless it was read
 
