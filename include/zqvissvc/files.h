@@ -1,9 +1,9 @@
 /* Image files: writing, reading, and plain pixel buffers to and from files.
  *
- * Types by code and name: 1 "AIPD" (the native format: every pixel type, lossless), 4 "PNG" (U8
- * with or without colour table, I16, RGB, RGB (U64)). Names are compared without regard to letter
- * case; leading white space is skipped, blanks behind the name and characters after the eighth do
- * not count.
+ * Types by code and name: 0 "BMP" (U8 with or without colour table, RGB without alpha), 1 "AIPD"
+ * (the native format: every pixel type, lossless), 4 "PNG" (U8 with or without colour table, I16,
+ * RGB, RGB (U64)). Names are compared without regard to letter case; leading white space is
+ * skipped, blanks behind the name and characters after the eighth do not count.
  *
  * Paths are zero-terminated, in the encoding of the C run-time. Writing never leaves a half-written
  * file over a good one: the new file is made beside the old one and takes its place when it is
@@ -61,9 +61,10 @@ typedef struct ZqRawParameters {
  * colourTable  borrowed; null, or an array of 0 or 256 entries 0xAARRGGBB (else -1074395976), 256
  *              for U8 images only (else -1074396082). PNG keeps it; AIPD has no place for it.
  * options      borrowed; may be null.
- * -1074396077 when the type cannot hold the image's pixel type, -1074396154 for a PNG without
- * pixels. After a failure the path holds what it held before; only a new AIPD file whose header
- * could not be written (-1074395988) stays as far as it went. */
+ * -1074396077 when the type cannot hold the image's pixel type, -1074396154 for a BMP or PNG
+ * without pixels, -1074396074 for a BMP of 4 GiB and more. After a failure the path holds what it
+ * held before; only a new AIPD file whose header could not be written (-1074395988) stays as far as
+ * it went. */
 ZQ_API ZqError ZQ_CALL DF_WriteFile2(const ZqImageValue* image, const char* path,
                                      const char* fileType, ZqArrayU32Handle* colourTable,
                                      const ZqWriteOptions* options, ZqErrorCluster* error);
@@ -111,9 +112,11 @@ ZQ_API ZqError ZQ_CALL ZqWriteFileByCode(const char* path, ZqImageHandle image,
                                          ZqArrayU32Handle* colourTable);
 
 /* Reads a file into an image, which takes the type and size that the file holds and keeps its
- * border. Palette pictures become U8 indices. PNG of 16-bit grey becomes I16; samples above 32767
- * come through with all samples moved down by 32768 (see ZqGetSampleOffset), and a write gives the
- * file's samples back.
+ * border. Palette pictures become U8 indices; a BMP whose palette is the ramp of greys becomes the
+ * greys. A BMP with a resolution sets the image's calibration (unit 5, metre), and a write of an
+ * image calibrated in metres, centimetres or inches (5, 4, 8) stores it. PNG of 16-bit grey becomes
+ * I16; samples above 32767 come through with all samples moved down by 32768 (see
+ * ZqGetSampleOffset), and a write gives the file's samples back.
  * path         borrowed; empty or null: -1074395989.
  * raw          borrowed; may be null. With parameters present the file is read by them:
  *              -1074396074 for an image without pixels.

@@ -11,6 +11,9 @@ constexpr std::uint16_t load_be16(const std::uint8_t* bytes) {
 constexpr std::uint32_t load_be32(const std::uint8_t* bytes) {
     return std::uint32_t{load_be16(bytes)} << 16 | load_be16(bytes + 2);
 }
+constexpr std::uint16_t load_le16(const std::uint8_t* bytes) {
+    return static_cast<std::uint16_t>(bytes[1] << 8 | bytes[0]);
+}
 constexpr std::uint32_t load_le32(const std::uint8_t* bytes) {
     return std::uint32_t{bytes[3]} << 24 | std::uint32_t{bytes[2]} << 16 |
            std::uint32_t{bytes[1]} << 8 | bytes[0];
@@ -18,6 +21,10 @@ constexpr std::uint32_t load_le32(const std::uint8_t* bytes) {
 constexpr void store_be16(std::uint8_t* bytes, std::uint16_t value) {
     bytes[0] = static_cast<std::uint8_t>(value >> 8);
     bytes[1] = static_cast<std::uint8_t>(value);
+}
+constexpr void store_le16(std::uint8_t* bytes, std::uint16_t value) {
+    bytes[0] = static_cast<std::uint8_t>(value);
+    bytes[1] = static_cast<std::uint8_t>(value >> 8);
 }
 constexpr void store_le32(std::uint8_t* bytes, std::uint32_t value) {
     for (int i = 0; i < 4; ++i) {

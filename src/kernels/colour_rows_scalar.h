@@ -15,4 +15,21 @@ inline void rgb_to_bgra(const std::uint8_t* source, std::uint8_t* destination, s
     }
 }
 
+inline void bgr_to_bgra(const std::uint8_t* source, std::uint8_t* destination, std::size_t pixels) {
+    for (std::size_t i = 0; i < pixels; ++i, source += 3, destination += 4) {
+        destination[0] = source[0];
+        destination[1] = source[1];
+        destination[2] = source[2];
+        destination[3] = 0;
+    }
+}
+
+inline void bgra_to_bgr(const std::uint8_t* source, std::uint8_t* destination, std::size_t pixels) {
+    for (std::size_t i = 0; i < pixels; ++i, source += 4, destination += 3) {
+        destination[0] = source[0];
+        destination[1] = source[1];
+        destination[2] = source[2];
+    }
+}
+
 }  // namespace zq::scalar

@@ -16,16 +16,29 @@ namespace {
 constexpr std::uint8_t kGuard = 0xA5;
 
 TEST(Kernels, ColourRowsEqualThePlainLoopAndStayInside) {
+    using Kernel = void (*)(const std::uint8_t*, std::uint8_t*, std::size_t);
+    struct Case {
+        const char* name;
+        std::size_t read;  // bytes a pixel
+        Kernel fast, plain;
+    };
+    const Case cases[] = {
+        {"rgb_to_bgra", 3, rgb_to_bgra, scalar::rgb_to_bgra},
+        {"bgr_to_bgra", 3, bgr_to_bgra, scalar::bgr_to_bgra},
+        {"bgra_to_bgr", 4, bgra_to_bgr, scalar::bgra_to_bgr},
+    };
     std::mt19937 random(3);
     zqtest::on_every_simd_target([&] {
-        for (std::size_t pixels = 0; pixels <= 200; ++pixels) {
-            std::vector<std::uint8_t> source(3 * pixels);
-            for (auto& byte : source) byte = static_cast<std::uint8_t>(random());
-            std::vector<std::uint8_t> expected(4 * pixels + 64, kGuard);
-            std::vector<std::uint8_t> actual = expected;
-            scalar::rgb_to_bgra(source.data(), expected.data() + 1, pixels);
-            rgb_to_bgra(source.data(), actual.data() + 1, pixels);
-            ASSERT_EQ(actual, expected) << pixels << " pixels";
+        for (const Case& c : cases) {
+            for (std::size_t pixels = 0; pixels <= 200; ++pixels) {
+                std::vector<std::uint8_t> source(c.read * pixels);
+                for (auto& byte : source) byte = static_cast<std::uint8_t>(random());
+                std::vector<std::uint8_t> expected((7 - c.read) * pixels + 64, kGuard);
+                std::vector<std::uint8_t> actual = expected;
+                c.plain(source.data(), expected.data() + 1, pixels);
+                c.fast(source.data(), actual.data() + 1, pixels);
+                ASSERT_EQ(actual, expected) << c.name << ' ' << pixels << " pixels";
+            }
         }
     });
 }
