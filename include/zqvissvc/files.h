@@ -1,9 +1,10 @@
 /* Image files: writing, reading, and plain pixel buffers to and from files.
  *
  * Types by code and name: 0 "BMP" (U8 with or without colour table, RGB without alpha), 1 "AIPD"
- * (the native format: every pixel type, lossless), 4 "PNG" (U8 with or without colour table, I16,
- * RGB, RGB (U64)). Names are compared without regard to letter case; leading white space is
- * skipped, blanks behind the name and characters after the eighth do not count.
+ * (the native format: every pixel type, lossless), 3 "JPEG" (U8, RGB without alpha), 4 "PNG" (U8
+ * with or without colour table, I16, RGB, RGB (U64)). Names are compared without regard to letter
+ * case; leading white space is skipped, blanks behind the name and characters after the eighth do
+ * not count.
  *
  * Paths are zero-terminated, in the encoding of the C run-time. Writing never leaves a half-written
  * file over a good one: the new file is made beside the old one and takes its place when it is
@@ -29,7 +30,9 @@ ZQ_BEGIN_C
  *           -1074395997. Strength s = 100 - setting: zlib level s / 10, at most 9; the last digit
  *           of s picks the row filter: 0 none, 1 sub, 2 up, 3 average, 4 Paeth, 5 all for strong
  *           compression of colour and else none, 6 to 9 all. The default is level 6 with all.
- *           JPEG: quality, 0 to 1000.
+ *           JPEG: quality, 0 to 1000, else -1074395997; the default is 750. It is libjpeg's scale
+ * of 1 to 100 in tenths, rounded (0 to 14 are 1). Colours have half the resolution in both
+ *           directions below 900.
  * words[1], words[2]  other formats' parameters; 0. */
 typedef struct ZqWriteOptions {
     int32_t present;
@@ -61,10 +64,10 @@ typedef struct ZqRawParameters {
  * colourTable  borrowed; null, or an array of 0 or 256 entries 0xAARRGGBB (else -1074395976), 256
  *              for U8 images only (else -1074396082). PNG keeps it; AIPD has no place for it.
  * options      borrowed; may be null.
- * -1074396077 when the type cannot hold the image's pixel type, -1074396154 for a BMP or PNG
- * without pixels, -1074396074 for a BMP of 4 GiB and more. After a failure the path holds what it
- * held before; only a new AIPD file whose header could not be written (-1074395988) stays as far as
- * it went. */
+ * -1074396077 when the type cannot hold the image's pixel type, -1074396154 for a BMP, JPEG or
+ * PNG without pixels, -1074396074 for a BMP of 4 GiB and more and for a JPEG with a side above
+ * 65500 pixels. After a failure the path holds what it held before; only a new AIPD file whose
+ * header could not be written (-1074395988) stays as far as it went. */
 ZQ_API ZqError ZQ_CALL DF_WriteFile2(const ZqImageValue* image, const char* path,
                                      const char* fileType, ZqArrayU32Handle* colourTable,
                                      const ZqWriteOptions* options, ZqErrorCluster* error);
@@ -114,8 +117,10 @@ ZQ_API ZqError ZQ_CALL ZqWriteFileByCode(const char* path, ZqImageHandle image,
 /* Reads a file into an image, which takes the type and size that the file holds and keeps its
  * border. Palette pictures become U8 indices; a BMP whose palette is the ramp of greys becomes the
  * greys. A BMP with a resolution sets the image's calibration (unit 5, metre), and a write of an
- * image calibrated in metres, centimetres or inches (5, 4, 8) stores it. PNG of 16-bit grey becomes
- * I16; samples above 32767 come through with all samples moved down by 32768 (see
+ * image calibrated in metres, centimetres or inches (5, 4, 8) stores it. A JPEG with a JFIF density
+ * sets the calibration, too: its numbers, as they are, become the steps, its unit 8 (inch), 4 (cm)
+ * or 0; a write does the reverse with the steps rounded and kept within 1 to 65535. PNG of 16-bit
+ * grey becomes I16; samples above 32767 come through with all samples moved down by 32768 (see
  * ZqGetSampleOffset), and a write gives the file's samples back.
  * path         borrowed; empty or null: -1074395989.
  * raw          borrowed; may be null. With parameters present the file is read by them:

@@ -5,6 +5,24 @@
 
 namespace zq {
 
+namespace {
+
+// Warnings after which libjpeg goes on with pixels that it made up.
+bool is_damage(int message) {
+    switch (message) {
+        case JWRN_ARITH_BAD_CODE:
+        case JWRN_HIT_MARKER:
+        case JWRN_HUFF_BAD_CODE:
+        case JWRN_JPEG_EOF:
+        case JWRN_MUST_RESYNC:
+            return true;
+        default:
+            return false;
+    }
+}
+
+}  // namespace
+
 JpegSession::JpegSession() {
     jpeg_std_error(&errors_);
     errors_.error_exit = on_error;
@@ -30,7 +48,11 @@ void JpegSession::on_error(j_common_ptr jpeg) {
 
 // Warnings have level -1; what is above is tracing.
 void JpegSession::on_message(j_common_ptr jpeg, int level) {
-    if (level < 0) ++jpeg->err->num_warnings;
+    if (level >= 0) return;
+    ++jpeg->err->num_warnings;
+    if (is_damage(jpeg->err->msg_code)) {
+        ++static_cast<JpegSession*>(jpeg->client_data)->damages_;
+    }
 }
 
 JpegCompressor::JpegCompressor() {

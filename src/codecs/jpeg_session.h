@@ -34,8 +34,10 @@ class JpegSession {
     // For callbacks of libjpeg: records the code and leaves the running step.
     [[noreturn]] static void fail(j_common_ptr jpeg, GRLIBError_enum code);
 
-    // Damage that libjpeg passed over so far: missing bytes, impossible codes.
+    // What libjpeg found wrong and passed over so far, harmless oddities included.
     long warnings() const { return errors_.num_warnings; }
+    // Those of them that cost pixels: missing bytes, impossible codes.
+    long damages() const { return damages_; }
 
   protected:
     JpegSession();
@@ -55,6 +57,7 @@ class JpegSession {
     jpeg_error_mgr errors_{};
     std::jmp_buf back_{};
     GRLIBError_enum failure_ = kSuccess;
+    long damages_ = 0;
 };
 
 class JpegCompressor final : public JpegSession {

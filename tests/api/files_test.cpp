@@ -48,11 +48,22 @@ TEST_F(FilesTest, PicksTheTypeByItsNormalisedName) {
         const char* magic;  // null: refused
     };
     const Case cases[] = {
-        {"AIPD", "AIPD"},        {"aipd", "AIPD"},         {" \t\n\v\f\rPng", "\x89PNG"},
-        {"PNG     ", "\x89PNG"}, {"PNG     x", "\x89PNG"}, {"PNG x", nullptr},
-        {"bmp", "BM"},           {"PN", nullptr},          {"PNGS", nullptr},
-        {"TIF", nullptr},        {"JPG", nullptr},         {"RAW", nullptr},
-        {"", nullptr},           {"   ", nullptr},         {nullptr, nullptr},
+        {"AIPD", "AIPD"},
+        {"aipd", "AIPD"},
+        {" \t\n\v\f\rPng", "\x89PNG"},
+        {"PNG     ", "\x89PNG"},
+        {"PNG     x", "\x89PNG"},
+        {"PNG x", nullptr},
+        {"bmp", "BM"},
+        {" jpeg", "\xFF\xD8\xFF"},
+        {"PN", nullptr},
+        {"PNGS", nullptr},
+        {"TIF", nullptr},
+        {"JPG", nullptr},
+        {"RAW", nullptr},
+        {"", nullptr},
+        {"   ", nullptr},
+        {nullptr, nullptr},
     };
     Picture picture(ZQ_TYPE_U8, 5, 4);
     for (const Case& c : cases) {
@@ -68,7 +79,8 @@ TEST_F(FilesTest, PicksTheTypeByItsCode) {
     Picture picture(ZQ_TYPE_U8, 5, 4);
     for (int32_t code = -1; code <= 8; ++code) {
         SCOPED_TRACE(code);
-        const ZqError expected = code == 0 || code == 1 || code == 4 ? 0 : kUnsupported;
+        const ZqError expected =
+            code == 0 || code == 1 || code == 3 || code == 4 ? 0 : kUnsupported;
         EXPECT_EQ(ZqWriteFileByCode(path_.c_str(), picture.handle(), nullptr, code, nullptr),
                   expected);
     }
@@ -121,7 +133,7 @@ TEST_F(FilesTest, TellsWhatTheFileIs) {
 TEST_F(FilesTest, KeepsTheImageWhenAnOutputFails) {
     Picture picture(ZQ_TYPE_U8, 5, 4), same_shape(ZQ_TYPE_U8, 5, 4), other_shape(ZQ_TYPE_RGB, 2, 2);
     picture.fill(9);
-    for (const char* type : {"BMP", "AIPD", "PNG"}) {
+    for (const char* type : {"BMP", "AIPD", "JPEG", "PNG"}) {
         ASSERT_EQ(write(picture, path_, type), 0);
         for (Picture* target : {&same_shape, &other_shape}) {
             const std::string before = target->state();
