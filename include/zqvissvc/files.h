@@ -1,10 +1,10 @@
 /* Image files: writing, reading, and plain pixel buffers to and from files.
  *
  * Types by code and name: 0 "BMP" (U8 with or without colour table, RGB without alpha), 1 "AIPD"
- * (the native format: every pixel type, lossless), 3 "JPEG" (U8, RGB without alpha), 4 "PNG" (U8
- * with or without colour table, I16, RGB, RGB (U64)). Names are compared without regard to letter
- * case; leading white space is skipped, blanks behind the name and characters after the eighth do
- * not count.
+ * (the native format: every pixel type, lossless), 2 "TIFF" (U8 with or without colour table, I16,
+ * RGB and RGB (U64) without alpha), 3 "JPEG" (U8, RGB without alpha), 4 "PNG" (U8 with or without
+ * colour table, I16, RGB, RGB (U64)). Names are compared without regard to letter case; leading
+ * white space is skipped, blanks behind the name and characters after the eighth do not count.
  *
  * Paths are zero-terminated, in the encoding of the C run-time. Writing never leaves a half-written
  * file over a good one: the new file is made beside the old one and takes its place when it is
@@ -31,9 +31,12 @@ ZQ_BEGIN_C
  *           of s picks the row filter: 0 none, 1 sub, 2 up, 3 average, 4 Paeth, 5 all for strong
  *           compression of colour and else none, 6 to 9 all. The default is level 6 with all.
  *           JPEG: quality, 0 to 1000, else -1074395997; the default is 750. It is libjpeg's scale
- * of 1 to 100 in tenths, rounded (0 to 14 are 1). Colours have half the resolution in both
+ *           of 1 to 100 in tenths, rounded (0 to 14 are 1). Colours have half the resolution in both
  *           directions below 900.
- * words[1], words[2]  other formats' parameters; 0. */
+ * words[1]  other formats' parameters; 0.
+ * words[2]  TIFF: compression. 0 none, 2 JPEG (U8 without colour table and RGB, lossy), 4 PackBits,
+ *           5 deflate (tag 32946); of any other value the low 16 bits are the tag itself: 1 none, 5
+ *           LZW (as 0x10005), 8 deflate. Another tag, or JPEG of another picture: -1074395986. */
 typedef struct ZqWriteOptions {
     int32_t present;
     int32_t words[3];
@@ -62,12 +65,16 @@ typedef struct ZqRawParameters {
  * path         borrowed; empty or null: -1074395997.
  * fileType     borrowed; a name from above.
  * colourTable  borrowed; null, or an array of 0 or 256 entries 0xAARRGGBB (else -1074395976), 256
- *              for U8 images only (else -1074396082). PNG keeps it; AIPD has no place for it.
+ *              for U8 images only (else -1074396082). PNG keeps it, TIFF all but alpha; AIPD has no
+ *              place for it.
  * options      borrowed; may be null.
- * -1074396077 when the type cannot hold the image's pixel type, -1074396154 for a BMP, JPEG or
- * PNG without pixels, -1074396074 for a BMP of 4 GiB and more and for a JPEG with a side above
- * 65500 pixels. After a failure the path holds what it held before; only a new AIPD file whose
- * header could not be written (-1074395988) stays as far as it went. */
+ * -1074396077 when the type cannot hold the image's pixel type, -1074396154 for a BMP, JPEG, PNG or
+ * TIFF without pixels, -1074396074 for a BMP of 4 GiB and more and for a JPEG with a side above
+ * 65500 pixels, -1074395986 for a TIFF compression that does not fit. TIFF holds I16 with negative
+ * values as signed samples, and takes its resolution from a calibration in inches (unit 8),
+ * centimetres (4) or metres (5). It cannot go to a pipe. After a failure the path holds what it held
+ * before; only a new AIPD file whose header could not be written (-1074395988) stays as far as it
+ * went. */
 ZQ_API ZqError ZQ_CALL DF_WriteFile2(const ZqImageValue* image, const char* path,
                                      const char* fileType, ZqArrayU32Handle* colourTable,
                                      const ZqWriteOptions* options, ZqErrorCluster* error);
@@ -119,17 +126,21 @@ ZQ_API ZqError ZQ_CALL ZqWriteFileByCode(const char* path, ZqImageHandle image,
  * greys. A BMP with a resolution sets the image's calibration (unit 5, metre), and a write of an
  * image calibrated in metres, centimetres or inches (5, 4, 8) stores it. A JPEG with a JFIF density
  * sets the calibration, too: its numbers, as they are, become the steps, its unit 8 (inch), 4 (cm)
- * or 0; a write does the reverse with the steps rounded and kept within 1 to 65535. PNG of 16-bit
- * grey becomes I16; samples above 32767 come through with all samples moved down by 32768 (see
- * ZqGetSampleOffset), and a write gives the file's samples back.
+ * or 0; a write does the reverse with the steps rounded and kept within 1 to 65535. PNG and TIFF of
+ * 16-bit grey become I16; unsigned samples above 32767 come through with all samples moved down by
+ * 32768 (see ZqGetSampleOffset), and a write gives the file's samples back. Of a TIFF the first page
+ * is read and turned as its orientation says; grey of 9 to 15 bits becomes I16 with that bit depth,
+ * grey of 32 and 64 bits float; CMYK, YCbCr and CIE L*a*b* become RGB; a resolution becomes the
+ * calibration (unit 8 inch, 4 centimetre).
  * path         borrowed; empty or null: -1074395989.
  * raw          borrowed; may be null. With parameters present the file is read by them:
  *              -1074396074 for an image without pixels.
  * typeName     written unless null: the type's name, padded with blanks to 8 characters; "xxx" when
  *              nobody recognises the file.
  * pixelFormat  written unless null: how the file holds its pixels: 0, 1, 2, 3 grey or indices of 1,
- *              2, 4, 8 bits; 6 grey of 16 bits; 8, 12, 14, 18, 19 colour of 24, 32, 48 (the
- *              machine's byte order), 48, 64 bits; 13 float; 15 complex; 17 HSL.
+ *              2, 4, 8 bits; 6 grey of 9 to 16 bits; 8, 12, 14, 18, 19 colour of 24, 32, 48 (the
+ *              machine's byte order), 48, 64 bits; 13 float, and any other grey of 32 or 64 bits;
+ *              15 complex; 17 HSL.
  * colourTable  written unless null: 256 entries 0xAARRGGBB when the file has a palette (alpha 0
  *              when it has no transparency, missing entries 0), else none.
  * On failure the image is what it was. */

@@ -36,6 +36,7 @@ enum GRLIBError_enum : std::int32_t {
     kUnsupportedFileType = -1074395991,
     kUnableToReadData = -1074395989,
     kUnableToWriteData = -1074395988,
+    kInvalidFileFormat = -1074395986,
     kDiskFull = -1074395983,
     kPaletteSize = -1074395976,
     kInitializationError = -1074395960,

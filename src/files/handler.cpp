@@ -91,6 +91,7 @@ void ImageFileHandler::read_lines(Image& image) {
 
 GRLIBError_enum ImageFileHandler::write(const char* path, const WriteJob& job) noexcept {
     job_ = &job;
+    output_path_ = path;
     const GRLIBError_enum code = code_of([&] { write_steps(path); });
     output_.reset();
     return code;

@@ -86,6 +86,7 @@ class ImageFileHandler {
     InputFile& input() const { return *input_; }
     OutputFile& output() { return *output_; }
     const WriteJob& job() const { return *job_; }
+    const char* output_path() const { return output_path_; }  // as the caller gave it
 
     Header header_;
 
@@ -100,6 +101,7 @@ class ImageFileHandler {
     unsigned name_id_;
     InputFile* input_ = nullptr;
     const WriteJob* job_ = nullptr;
+    const char* output_path_ = nullptr;
     std::optional<OutputFile> output_;
 };
 

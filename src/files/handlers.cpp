@@ -9,6 +9,7 @@
 #include "files/bmp_handler.h"
 #include "files/jpeg_handler.h"
 #include "files/png_handler.h"
+#include "files/tiff_handler.h"
 
 namespace zq {
 
@@ -22,6 +23,7 @@ std::unique_ptr<ImageFileHandler> make(const HandlerEntry& entry) {
 constexpr std::array kHandlers = {
     HandlerEntry{0, 140, make<BmpFileHandler>, true, true},
     HandlerEntry{1, 141, make<AipdFileHandler>, true, true},
+    HandlerEntry{2, 171, make<TiffFileHandler>, true, true},
     HandlerEntry{3, 190, make<JpegFileHandler>, true, true},
     HandlerEntry{4, 191, make<PngFileHandler>, true, true},
 };

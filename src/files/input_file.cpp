@@ -2,6 +2,7 @@
 #include "files/input_file.h"
 
 #include <cerrno>
+#include <utility>
 
 #include "base/checked.h"
 #include "files/stdio_errors.h"
@@ -24,6 +25,11 @@ void InputFile::rewind() {
 
 void InputFile::seek(long offset) {
     if (std::fseek(stream_.get(), offset, SEEK_SET) != 0) throw kUnableToReadData;
+}
+
+bool InputFile::try_seek(std::uint64_t offset) noexcept {
+    return std::in_range<long>(offset) &&
+           std::fseek(stream_.get(), static_cast<long>(offset), SEEK_SET) == 0;
 }
 
 std::size_t InputFile::read_some(void* bytes, std::size_t count) noexcept {

@@ -26,6 +26,9 @@ class InputFile {
     // Offset from the start. Throws kUnableToReadData.
     void seek(long offset);
 
+    // False where the stream has no such position.
+    bool try_seek(std::uint64_t offset) noexcept;
+
     // Bytes that came: fewer than asked for only at the end of the file or on a failure.
     std::size_t read_some(void* bytes, std::size_t count) noexcept;
     // All of them, or `short_read` is thrown.

@@ -2,6 +2,7 @@
 #include "files/output_file.h"
 
 #include <cerrno>
+#include <utility>
 
 #include "files/stdio_errors.h"
 #include "platform/file.h"
@@ -35,6 +36,16 @@ bool OutputFile::try_write(const void* bytes, std::size_t count) noexcept {
 
 bool OutputFile::try_flush() noexcept {
     if (std::fflush(stream_.get()) == 0) return true;
+    last_error_ = code_of_errno(errno);
+    return false;
+}
+
+bool OutputFile::try_seek(std::uint64_t offset) noexcept {
+    errno = 0;
+    if (std::in_range<long>(offset) &&
+        std::fseek(stream_.get(), static_cast<long>(offset), SEEK_SET) == 0) {
+        return true;
+    }
     last_error_ = code_of_errno(errno);
     return false;
 }

@@ -4,6 +4,7 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <memory>
 #include <string>
 
@@ -25,6 +26,9 @@ class OutputFile {
     // False on a failure; last_error() then says why.
     bool try_write(const void* bytes, std::size_t count) noexcept;
     bool try_flush() noexcept;
+    // Offset from the start. For formats that go back to what they wrote; what has no positions (a
+    // pipe) cannot hold those.
+    bool try_seek(std::uint64_t offset) noexcept;
     GRLIBError_enum last_error() const { return last_error_; }
 
     // Throw the mapped error number. Nothing can be written behind rows.

@@ -1,11 +1,11 @@
 // Reading PNG. libpng delivers rows in the layout of the image's type, straight into the image.
 #include "files/png_reader.h"
 
-#include <algorithm>
 #include <cstring>
 
 #include "base/checked.h"
 #include "files/png_chunks.h"
+#include "files/unsigned_grey.h"
 #include "files/write_job.h"
 #include "kernels/colour_rows.h"
 
@@ -15,8 +15,6 @@ namespace {
 
 // Deflate cannot grow data by more than this factor.
 constexpr std::uint64_t kMostInflation = 1032;
-constexpr std::int32_t kSignedMinimum = -32768;
-constexpr std::int32_t kSignedMaximum = 32767;
 
 void read_bytes(png_structp png, png_bytep bytes, std::size_t count) {
     auto* file = static_cast<InputFile*>(png_get_io_ptr(png));
@@ -41,19 +39,6 @@ std::optional<std::int16_t> find_sample_offset(png_structp png, png_infop info) 
         if (const auto offset = parse_sample_offset({chunk.data, chunk.size})) return offset;
     }
     return std::nullopt;
-}
-
-// Whether any of the unsigned samples is above 32767. Four at a time.
-bool any_above_signed(const std::uint8_t* row, std::size_t bytes) {
-    std::uint64_t all = 0;
-    std::size_t i = 0;
-    for (; i + sizeof(all) <= bytes; i += sizeof(all)) {
-        std::uint64_t four;
-        std::memcpy(&four, row + i, sizeof(four));
-        all |= four;
-    }
-    for (; i < bytes; i += 2) all |= std::uint64_t{row[i + 1]} << 8;
-    return (all & 0x8000800080008000U) != 0;
 }
 
 }  // namespace
@@ -204,17 +189,10 @@ void PngReader::read_pixels(Image& image) {
 // samples, and has some that are too large, comes through with all of them moved down.
 void PngReader::apply_sample_offset(Image& image, bool samples_above_signed) const {
     const std::int32_t offset = sample_offset_.value_or(
-        static_cast<std::int16_t>(samples_above_signed ? kSignedMinimum : 0));
+        static_cast<std::int16_t>(samples_above_signed ? kWholeRangeOffset : 0));
     image.set_sample_offset(offset);
     if (offset == 0 && !samples_above_signed) return;
-    for (std::int32_t y = 0; y < height(); ++y) {
-        auto* samples = reinterpret_cast<std::uint16_t*>(image.row(y));
-        for (std::int32_t x = 0; x < width(); ++x) {
-            const std::int32_t value = samples[x] + offset;
-            samples[x] =
-                static_cast<std::uint16_t>(std::clamp(value, kSignedMinimum, kSignedMaximum));
-        }
-    }
+    shift_unsigned_samples(image, offset);
 }
 
 }  // namespace zq

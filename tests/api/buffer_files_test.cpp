@@ -105,8 +105,6 @@ TEST_F(BufferFilesTest, ChecksItsArgumentsInOrder) {
         {"no extension behind the dot", "x.", &pixel, 0, 1, 1, kExtension},
         {"dot in the folder only", "a.png/x", &pixel, 0, 1, 1, kExtension},
         {"the last dot counts", "x.png.txt", &pixel, 0, 1, 1, kExtension},
-        {"type without a writer", "x.tif", &pixel, 0, 1, 1, kWriteFailed},
-        {"another", "x.Tiff", &pixel, 0, 1, 1, kWriteFailed},
         {"width", "x.png", &pixel, 0, 0, 1, kWriteFailed},
         {"height", "x.png", &pixel, 0, 1, -1, kWriteFailed},
         {"folder", "no such folder/x.png", &pixel, 0, 1, 1, kWriteFailed},
@@ -115,7 +113,8 @@ TEST_F(BufferFilesTest, ChecksItsArgumentsInOrder) {
         SCOPED_TRACE(c.name);
         EXPECT_EQ(Gen_SaveBuffer(c.path, c.buffer, 32, c.kind, c.width, c.height), c.code);
     }
-    EXPECT_EQ(Gen_SaveBuffer(folder_.path("x.pNg").c_str(), &pixel, 32, 0, 1, 1), 0);
+    for (const char* name : {"x.pNg", "x.tif", "x.Tiff"})
+        EXPECT_EQ(Gen_SaveBuffer(folder_.path(name).c_str(), &pixel, 32, 0, 1, 1), 0);
 }
 
 // What a file gives in the three types of a loaded buffer.

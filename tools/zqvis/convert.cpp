@@ -38,9 +38,10 @@ const Names kPixelTypes = {{"u8", ZQ_TYPE_U8},       {"i16", ZQ_TYPE_I16},
                            {"rgb", ZQ_TYPE_RGB},     {"hsl", ZQ_TYPE_HSL},
                            {"rgb64", ZQ_TYPE_RGBU64}};
 
-// Values of the TIFF option word.
+// Values of the TIFF option word. 5 means deflate; LZW, whose tag that is, is reached by the same
+// low half of the word.
 const Names kTiffCompressions = {
-    {"none", 1}, {"jpeg", 2}, {"lzw", 3}, {"packbits", 4}, {"deflate", 5}};
+    {"none", 1}, {"jpeg", 2}, {"lzw", 0x10005}, {"packbits", 4}, {"deflate", 5}};
 
 // Nothing for an option that was not given; the parser has refused other names.
 std::optional<int32_t> value_of(const Names& names, const std::string& name) {

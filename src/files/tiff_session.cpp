@@ -1,0 +1,126 @@
+// libtiff's handle, its view of the file, and its limits.
+#include "files/tiff_session.h"
+
+#include <algorithm>
+#include <limits>
+#include <memory>
+
+#include "files/tiff_directory.h"
+
+namespace zq {
+
+namespace {
+
+// Largest single block that libtiff may take for a file: what the file can hold compressed, its
+// strips inflated within reason, and room for the tables of a small one.
+constexpr std::uint64_t kLeastLimit = std::uint64_t{8} << 20;
+constexpr std::uint64_t kLimitFactor = 64;
+
+TiffStream& stream_of(thandle_t handle) {
+    return *static_cast<TiffStream*>(handle);
+}
+
+tmsize_t read_bytes(thandle_t handle, void* bytes, tmsize_t count) {
+    return static_cast<tmsize_t>(stream_of(handle).read(bytes, static_cast<std::size_t>(count)));
+}
+
+tmsize_t write_bytes(thandle_t handle, void* bytes, tmsize_t count) {
+    return static_cast<tmsize_t>(stream_of(handle).write(bytes, static_cast<std::size_t>(count)));
+}
+
+toff_t seek(thandle_t handle, toff_t offset, int from) {
+    TiffStream& stream = stream_of(handle);
+    if (from == SEEK_CUR) offset += stream.position;
+    if (from == SEEK_END) offset += stream.size;
+    return stream.seek(offset) ? offset : static_cast<toff_t>(-1);
+}
+
+int leave_open(thandle_t) {
+    return 0;
+}
+
+toff_t size_of(thandle_t handle) {
+    return stream_of(handle).size;
+}
+
+// Not 0: the handlers of the process, which print, are not called.
+int ignore_message(TIFF*, void*, const char*, const char*, va_list) {
+    return 1;
+}
+
+struct OptionsFreer {
+    void operator()(TIFFOpenOptions* options) const { TIFFOpenOptionsFree(options); }
+};
+
+tmsize_t memory_limit(std::uint64_t file_size) {
+    constexpr auto kMost = static_cast<std::uint64_t>(std::numeric_limits<tmsize_t>::max());
+    if (file_size > (kMost - kLeastLimit) / kLimitFactor)
+        return std::numeric_limits<tmsize_t>::max();
+    return static_cast<tmsize_t>(kLeastLimit + kLimitFactor * file_size);
+}
+
+}  // namespace
+
+bool TiffStream::seek(std::uint64_t offset) noexcept {
+    if (offset == position) return true;
+    const bool done = input != nullptr    ? input->try_seek(offset)
+                      : output != nullptr ? output->try_seek(offset)
+                                          : false;
+    if (done) position = offset;
+    return done;
+}
+
+std::size_t TiffStream::read(void* bytes, std::size_t count) noexcept {
+    if (input == nullptr) return 0;
+    const std::size_t came = input->read_some(bytes, count);
+    position += came;
+    if (came < count) short_read = true;
+    return came;
+}
+
+std::size_t TiffStream::write(const void* bytes, std::size_t count) noexcept {
+    if (output == nullptr || !output->try_write(bytes, count)) return 0;
+    position += count;
+    size = std::max(size, position);
+    return count;
+}
+
+TiffSession::TiffSession(InputFile& file) {
+    stream_.input = &file;
+    stream_.size = static_cast<std::uint64_t>(std::max<std::int64_t>(file.size(), 0));
+    check_tiff_directory(file);
+    if (!file.try_seek(0)) throw kUnableToReadData;
+    open("rm");
+    if (tiff_ == nullptr) throw stream_.short_read ? kUnableToReadData : kInvalidFileHeader;
+}
+
+TiffSession::TiffSession(OutputFile& file) {
+    stream_.output = &file;
+    open("wl");
+    if (tiff_ != nullptr) return;
+    throw file.last_error() != kSuccess ? file.last_error() : kUnableToWriteData;
+}
+
+void TiffSession::open(const char* mode) {
+    const std::unique_ptr<TIFFOpenOptions, OptionsFreer> options(TIFFOpenOptionsAlloc());
+    if (!options) throw kNotEnoughMemory;
+    if (stream_.input != nullptr) {
+        TIFFOpenOptionsSetMaxSingleMemAlloc(options.get(), memory_limit(stream_.size));
+    }
+    TIFFOpenOptionsSetErrorHandlerExtR(options.get(), ignore_message, nullptr);
+    TIFFOpenOptionsSetWarningHandlerExtR(options.get(), ignore_message, nullptr);
+    tiff_ = TIFFClientOpenExt("", mode, &stream_, read_bytes, write_bytes, seek, leave_open,
+                              size_of, nullptr, nullptr, options.get());
+}
+
+TiffSession::~TiffSession() {
+    stream_.input = nullptr;
+    stream_.output = nullptr;
+    if (tiff_ != nullptr) TIFFClose(tiff_);
+}
+
+bool TiffSession::read_at(std::uint64_t offset, void* bytes, std::size_t count) noexcept {
+    return stream_.seek(offset) && stream_.read(bytes, count) == count;
+}
+
+}  // namespace zq

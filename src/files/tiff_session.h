@@ -1,0 +1,52 @@
+// One use of libtiff: owns its handle, gives it a file, and keeps its messages from the process.
+#pragma once
+
+#include <tiffio.h>
+
+#include <cstdint>
+
+#include "files/input_file.h"
+#include "files/output_file.h"
+
+namespace zq {
+
+// The file as libtiff sees it. The position is kept here: asking a C stream to seek to where it
+// stands would make it drop its buffer.
+struct TiffStream {
+    InputFile* input = nullptr;
+    OutputFile* output = nullptr;  // both null: every use fails
+    std::uint64_t position = 0;
+    std::uint64_t size = 0;
+    bool short_read = false;  // some read came to the end of the file
+
+    bool seek(std::uint64_t offset) noexcept;
+    std::size_t read(void* bytes, std::size_t count) noexcept;
+    std::size_t write(const void* bytes, std::size_t count) noexcept;
+};
+
+class TiffSession {
+  public:
+    // The file must outlive all calls but the destructor. Reading takes in the first directory:
+    // throws kInvalidFileHeader, or kUnableToReadData when the file ends early. A file of unknown
+    // size counts as empty.
+    explicit TiffSession(InputFile& file);
+    explicit TiffSession(OutputFile& file);
+    // Writes nothing more.
+    ~TiffSession();
+    TiffSession(const TiffSession&) = delete;
+    TiffSession& operator=(const TiffSession&) = delete;
+
+    TIFF* tiff() const { return tiff_; }
+    std::uint64_t file_size() const { return stream_.size; }
+
+    // Bytes of the file itself. False unless all of them came.
+    bool read_at(std::uint64_t offset, void* bytes, std::size_t count) noexcept;
+
+  private:
+    void open(const char* mode);
+
+    TiffStream stream_;
+    TIFF* tiff_ = nullptr;
+};
+
+}  // namespace zq
