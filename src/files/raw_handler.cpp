@@ -5,7 +5,7 @@
 
 #include "base/checked.h"
 #include "files/raw_rows.h"
-#include "files/sample_offset.h"
+#include "files/unsigned_grey.h"
 
 namespace zq {
 
@@ -44,15 +44,20 @@ void RawFileHandler::read_lines(Image& image) {
         read_planes(image);
         return;
     }
+    bool above_signed = false;
     std::vector<std::uint8_t> line(target_.height == 1 ? line_bytes() : stride());
     for (std::int32_t i = 0; i < target_.height; ++i) {
         const bool is_last = i + 1 == target_.height;
         input().read(line.data(), is_last ? line_bytes() : line.size(), kUnableToReadData);
         swap_samples({line.data(), line_bytes()}, layout_.swapped_bytes);
+        above_signed = above_signed || any_above_signed(line.data(), line_bytes() / 2 * 2);
         const std::int32_t y = layout_.is_bottom_up ? target_.height - 1 - i : i;
         unpack_raw_row(layout_, line.data(), image.row(y), static_cast<std::size_t>(target_.width));
     }
-    if (layout_.format == PixelFormat::kUnsigned16) move_unsigned_samples(image);
+    if (layout_.format == PixelFormat::kUnsigned16 && above_signed) {
+        shift_unsigned_samples(image, kWholeRangeOffset);
+        image.set_sample_offset(kWholeRangeOffset);
+    }
 }
 
 // Each plane is a third of the data, which may be more than the picture needs.
