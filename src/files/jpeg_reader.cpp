@@ -4,10 +4,8 @@
 
 #include <memory>
 
-#include "convert/copy_rows.h"
 #include "files/jpeg_units.h"
 #include "kernels/alpha_rows.h"
-#include "kernels/stream_copy.h"
 
 namespace zq {
 
@@ -125,8 +123,8 @@ void JpegReader::read_row(const Image& image, std::uint32_t* between) {
     if (jpeg().num_components == 4) {
         cmyk_to_bgra(row, pixels, jpeg().saw_Adobe_marker != FALSE ? 0 : 255);
     }
-    const Stores stores = stores_for(4 * pixels * jpeg().output_height);
-    copy_with_alpha(between, reinterpret_cast<std::uint32_t*>(target), pixels, 0, stores);
+    // The image's memory is new, and what the system has just cleared is in the cache.
+    copy_with_alpha(between, reinterpret_cast<std::uint32_t*>(target), pixels, 0, Stores::kCached);
 }
 
 void JpegReader::read_pixels(Image& image) {
@@ -139,7 +137,6 @@ void JpegReader::read_pixels(Image& image) {
         // A file that lacks its end is a file cut short.
         jpeg_finish_decompress(&jpeg());
     });
-    finish_streaming();
     if (session_.damages() > 0) throw kUnableToReadData;
 }
 
