@@ -13,7 +13,7 @@ namespace zq {
 namespace {
 
 // Lines are read this many bytes at a time, but at least one.
-constexpr std::uint64_t kBand = std::uint64_t{128} * 1024;
+constexpr std::size_t kBand = std::size_t{128} * 1024;
 constexpr std::int32_t kMetre = 5;
 
 std::optional<Calibration> calibration_of(const BmpHeader& header) {
