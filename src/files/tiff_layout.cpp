@@ -3,8 +3,6 @@
 
 #include <algorithm>
 #include <array>
-#include <optional>
-#include <span>
 
 #include "base/checked.h"
 

@@ -5,7 +5,6 @@
 #include <array>
 #include <cmath>
 #include <memory>
-#include <span>
 
 #include "base/checked.h"
 #include "files/orientation.h"
