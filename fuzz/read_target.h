@@ -56,9 +56,17 @@ inline std::string state_of(const zq::Image& image) {
     return state;
 }
 
-inline GRLIBError_enum read(const char* path, zq::Image& target, zq::FileContents& contents) {
+// How a target reads a file into an image.
+using Reader = void (*)(const char* path, zq::Image& target, const zq::Accept& accept);
+
+inline void read_any(const char* path, zq::Image& target, const zq::Accept& accept) {
+    zq::read_file(path, target, nullptr, accept);
+}
+
+inline GRLIBError_enum read(Reader reader, const char* path, zq::Image& target,
+                            zq::FileContents& contents) {
     try {
-        zq::read_file(path, target, nullptr, [&](const zq::FileContents& c) { contents = c; });
+        reader(path, target, [&](const zq::FileContents& c) { contents = c; });
         return kSuccess;
     } catch (GRLIBError_enum code) {
         return code;
@@ -76,7 +84,7 @@ inline void check_contents(const zq::FileContents& contents, const zq::Image& im
 }
 
 // Once into another shape, then into the shape that came out of it.
-inline void read_target(const std::uint8_t* bytes, std::size_t size) {
+inline void read_target(const std::uint8_t* bytes, std::size_t size, Reader reader = read_any) {
     static const MemoryFile file;
     file.store(bytes, size);
     zq::Image target(zq::Variant::kPrivate, {});
@@ -86,7 +94,7 @@ inline void read_target(const std::uint8_t* bytes, std::size_t size) {
     const std::string before = state_of(target);
 
     zq::FileContents contents;
-    const GRLIBError_enum code = read(file.path(), target, contents);
+    const GRLIBError_enum code = read(reader, file.path(), target, contents);
     if (code != kSuccess) {
         constexpr std::array known = {kNotEnoughMemory, kInvalidFileHeader, kFileIo,
                                       kUnsupportedFileType, kUnableToReadData};
@@ -97,7 +105,7 @@ inline void read_target(const std::uint8_t* bytes, std::size_t size) {
     check_contents(contents, target);
     require(target.extent().border == 1, "the target's border");
     const std::string first = state_of(target);
-    require(read(file.path(), target, contents) == kSuccess, "the same result again");
+    require(read(reader, file.path(), target, contents) == kSuccess, "the same result again");
     require(state_of(target) == first, "the same pixels again");
 }
 

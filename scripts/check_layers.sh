@@ -7,9 +7,9 @@ report() { [[ -z $2 ]] || { printf '%s:\n%s\n' "$1" "$2"; status=1; }; }
 
 report "include against the order of the layers" "$(grep -rnE '^#include "[a-z]+/.*\.h"' src | awk -F'[:/"]' '
     BEGIN {
-        n = split("base codecs platform kernels image host convert", order, " ")
+        n = split("base codecs platform kernels image host convert serialize", order, " ")
         for (i = 1; i <= n; ++i) rank[order[i]] = i
-        rank["serialize"] = rank["files"] = rank["display"] = rank["timers"] = n + 1
+        rank["files"] = rank["display"] = rank["timers"] = n + 1
         rank["exports"] = n + 2
     }
     {

@@ -31,12 +31,11 @@ ZQ_BEGIN_C
  *           of s picks the row filter: 0 none, 1 sub, 2 up, 3 average, 4 Paeth, 5 all for strong
  *           compression of colour and else none, 6 to 9 all. The default is level 6 with all.
  *           JPEG: quality, 0 to 1000, else -1074395997; the default is 750. It is libjpeg's scale
- *           of 1 to 100 in tenths, rounded (0 to 14 are 1). Colours have half the resolution in both
- *           directions below 900.
- * words[1]  other formats' parameters; 0.
- * words[2]  TIFF: compression. 0 none, 2 JPEG (U8 without colour table and RGB, lossy), 4 PackBits,
- *           5 deflate (tag 32946); of any other value the low 16 bits are the tag itself: 1 none, 5
- *           LZW (as 0x10005), 8 deflate. Another tag, or JPEG of another picture: -1074395986. */
+ *           of 1 to 100 in tenths, rounded (0 to 14 are 1). Colours have half the resolution in
+ * both directions below 900. words[1]  other formats' parameters; 0. words[2]  TIFF: compression. 0
+ * none, 2 JPEG (U8 without colour table and RGB, lossy), 4 PackBits, 5 deflate (tag 32946); of any
+ * other value the low 16 bits are the tag itself: 1 none, 5 LZW (as 0x10005), 8 deflate. Another
+ * tag, or JPEG of another picture: -1074395986. */
 typedef struct ZqWriteOptions {
     int32_t present;
     int32_t words[3];
@@ -72,9 +71,9 @@ typedef struct ZqRawParameters {
  * TIFF without pixels, -1074396074 for a BMP of 4 GiB and more and for a JPEG with a side above
  * 65500 pixels, -1074395986 for a TIFF compression that does not fit. TIFF holds I16 with negative
  * values as signed samples, and takes its resolution from a calibration in inches (unit 8),
- * centimetres (4) or metres (5). It cannot go to a pipe. After a failure the path holds what it held
- * before; only a new AIPD file whose header could not be written (-1074395988) stays as far as it
- * went. */
+ * centimetres (4) or metres (5). It cannot go to a pipe. After a failure the path holds what it
+ * held before; only a new AIPD file whose header could not be written (-1074395988) stays as far as
+ * it went. */
 ZQ_API ZqError ZQ_CALL DF_WriteFile2(const ZqImageValue* image, const char* path,
                                      const char* fileType, ZqArrayU32Handle* colourTable,
                                      const ZqWriteOptions* options, ZqErrorCluster* error);
@@ -110,6 +109,31 @@ ZQ_API ZqError ZQ_CALL Gen_LoadBuffer(const char* path, int32_t mode, void** out
  * 0. */
 ZQ_API ZqError ZQ_CALL Gen_FreeLoadedBuffer(void* buffer);
 
+/* Writes an image as PNG with its vision information: the objects that hang on it and can be
+ * flattened (ZqRegisterAttachmentClass) and its custom data, besides pixels, calibration, sample
+ * offset and bit depth, which every PNG has. HSL is written as RGB; the image stays HSL.
+ * image        borrowed.
+ * path         borrowed; empty or null: -1074395997.
+ * colourTable  as for DF_WriteFile2.
+ * -1074396077 for Float and Complex, -1074395988 for more than 1000 objects, 256 MiB of them or a
+ * value of custom data that no text chunk can hold; the code of an object that refuses to be
+ * flattened; the codes of DF_WriteFile2. After a failure the path holds what it held before. */
+ZQ_API ZqError ZQ_CALL DF_WriteImageAndVisionInfo(const ZqImageValue* image, const char* path,
+                                                  ZqArrayU32Handle* colourTable,
+                                                  ZqErrorCluster* error);
+
+/* Reads a PNG into an image, as ZqReadFile does, with the vision information that the file holds,
+ * or none. The image then has these objects and this custom data alone; what hung on it before is
+ * destroyed. Information that is damaged is left out without an error.
+ * wantColourTable  0: the table is not touched.
+ * colourTable      written when wanted, unless null: as by ZqReadFile.
+ * -1074395989 for an empty or null path, -1074395991 for a file that is no PNG; the codes of
+ * ZqReadFile. On failure the image and what hangs on it are what they were. */
+ZQ_API ZqError ZQ_CALL DF_ReadImageAndVisionInfo(const ZqImageValue* image, const char* path,
+                                                 uint8_t wantColourTable,
+                                                 ZqArrayU32Handle* colourTable,
+                                                 ZqErrorCluster* error);
+
 /* ---- Core functions for sibling libraries (by ordinal on Windows). They return a code and report
  * nowhere. */
 
@@ -128,11 +152,10 @@ ZQ_API ZqError ZQ_CALL ZqWriteFileByCode(const char* path, ZqImageHandle image,
  * sets the calibration, too: its numbers, as they are, become the steps, its unit 8 (inch), 4 (cm)
  * or 0; a write does the reverse with the steps rounded and kept within 1 to 65535. PNG and TIFF of
  * 16-bit grey become I16; unsigned samples above 32767 come through with all samples moved down by
- * 32768 (see ZqGetSampleOffset), and a write gives the file's samples back. Of a TIFF the first page
- * is read and turned as its orientation says; grey of 9 to 15 bits becomes I16 with that bit depth,
- * grey of 32 and 64 bits float; CMYK, YCbCr and CIE L*a*b* become RGB; a resolution becomes the
- * calibration (unit 8 inch, 4 centimetre).
- * path         borrowed; empty or null: -1074395989.
+ * 32768 (see ZqGetSampleOffset), and a write gives the file's samples back. Of a TIFF the first
+ * page is read and turned as its orientation says; grey of 9 to 15 bits becomes I16 with that bit
+ * depth, grey of 32 and 64 bits float; CMYK, YCbCr and CIE L*a*b* become RGB; a resolution becomes
+ * the calibration (unit 8 inch, 4 centimetre). path         borrowed; empty or null: -1074395989.
  * raw          borrowed; may be null. With parameters present the file is read by them:
  *              -1074396074 for an image without pixels.
  * typeName     written unless null: the type's name, padded with blanks to 8 characters; "xxx" when
@@ -147,6 +170,65 @@ ZQ_API ZqError ZQ_CALL ZqWriteFileByCode(const char* path, ZqImageHandle image,
 ZQ_API ZqError ZQ_CALL ZqReadFile(ZqImageHandle image, const char* path, const ZqRawParameters* raw,
                                   ZqStringHandle* typeName, int32_t* pixelFormat,
                                   ZqArrayU32Handle* colourTable);
+
+/* What a PNG says beside the image. Zeros are the defaults.
+ * background...  colour of the background, in samples of the file: 0 to 255, or 0 to 65535 for the
+ *                16-bit types; larger values count as the largest. Every file has it; one with a
+ *                palette names the nearest entry.
+ * gamma          100000 times the exponent of the samples; 0: not written.
+ * chromaticities 100000 times x and y of white, red, green and blue; all 0: not written. Values
+ *                that make no colour space are not written either. */
+typedef struct ZqPngSettings {
+    uint16_t backgroundRed;
+    uint16_t backgroundGreen;
+    uint16_t backgroundBlue;
+    uint16_t reserved;
+    int32_t gamma;
+    int32_t chromaticities[8];
+} ZqPngSettings;
+
+/* A PNG file with vision information, on its way between file and image: settings and what the file
+ * carries. Threads: one at a time. */
+typedef struct ZqVisionFile ZqVisionFile;
+
+/* Makes such an object; `settings` (copied) may be null. *file, not null, receives it and is
+ * unchanged on failure. It belongs to the caller, until ZqDisposeVisionFile frees it with all that
+ * it holds; null is ignored there. */
+ZQ_API ZqError ZQ_CALL ZqNewVisionFile(const ZqPngSettings* settings, ZqVisionFile** file);
+ZQ_API ZqError ZQ_CALL ZqDisposeVisionFile(ZqVisionFile* file);
+
+/* As DF_WriteImageAndVisionInfo, for an image handle and with options.
+ * options  borrowed; may be null.
+ * file     borrowed; may be null. Otherwise its settings are used, and each part that it holds is
+ *          written in place of what the image would give. It does not change. */
+ZQ_API ZqError ZQ_CALL ZqWriteVisionFile(const char* path, ZqImageHandle image,
+                                         const ZqWriteOptions* options,
+                                         ZqArrayU32Handle* colourTable, const ZqVisionFile* file);
+
+/* As DF_ReadImageAndVisionInfo, for an image handle.
+ * pixelFormat, colourTable  written unless null, as by ZqReadFile.
+ * file  may be null. Otherwise it then holds the parts that the file has, and no others; on failure
+ *       it is what it was. */
+ZQ_API ZqError ZQ_CALL ZqReadVisionFile(ZqImageHandle image, const char* path, int32_t* pixelFormat,
+                                        ZqArrayU32Handle* colourTable, ZqVisionFile* file);
+
+/* The parts of such an object, as bytes. Payloads are those of the chunks before deflating
+ * (docs/png-vision.md). */
+#define ZQ_VISION_TIMING 0          /* payload of pmTI, whose meaning is its owner's */
+#define ZQ_VISION_OBJECTS 1         /* payload of zqEI */
+#define ZQ_VISION_PRIVATE_OBJECTS 2 /* payload of zqEi */
+#define ZQ_VISION_VERSION 3         /* text of the file's "Version"; written by a read only */
+
+/* Gives a part: *bytes its address, valid until the object changes, *size its bytes; null and 0 for
+ * one that is not held. Outputs may be null. -1074395269 for a null object, -1074395997 for another
+ * part. */
+ZQ_API ZqError ZQ_CALL ZqGetVisionPart(const ZqVisionFile* file, int32_t part, const void** bytes,
+                                       uint32_t* size);
+
+/* Sets a payload (copied); size 0 takes it away. -1074395269 for a null object or null bytes,
+ * -1074395997 for another part, the version included. */
+ZQ_API ZqError ZQ_CALL ZqSetVisionPart(ZqVisionFile* file, int32_t part, const void* bytes,
+                                       uint32_t size);
 
 /* Converts a picture into the type of `destination`, which gets the source's size and border; every
  * pair of types by the rules of DF_Convert. An image converted into itself stays as it is. On

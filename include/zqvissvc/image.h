@@ -192,26 +192,33 @@ ZQ_API ZqError ZQ_CALL ZqFindAttachment(ZqImageHandle image, const ZqClassId* cl
                                         void** object);
 ZQ_API ZqError ZQ_CALL ZqRemoveAttachment(ZqImageHandle image, const ZqClassId* classId);
 
-/* A class of objects whose owner lets them travel with a flattened image. flattenedSize gives the
+/* A class of objects whose owner lets them travel with a flattened image or a PNG file with vision
+ * information (files.h). flattenedSize gives the
  * bytes that an object takes; flatten writes them into a block that is 4 bytes larger; create makes
  * an object from them, which destroy (may be null) ends. flatten and create return 0 or a code,
  * which becomes the result of the call that wanted the object. All of them may be called from any
  * thread, with the image locked; they must not dispose the image or its attachments. Unregistering
- * does not wait for calls under way; destroy is called as long as one of the objects lives. */
+ * does not wait for calls under way; destroy is called as long as one of the objects lives.
+ * headerWord (may be null: 0) gives a word that a file keeps beside an object's bytes; classNumber
+ * decides the part of the file: 65535 the one of private objects, any other number the common one.
+ */
 typedef uint32_t(ZQ_CALL* ZqFlattenedSizeProc)(void* object);
 typedef ZqError(ZQ_CALL* ZqFlattenObjectProc)(void* object, void* block);
 typedef ZqError(ZQ_CALL* ZqCreateObjectProc)(const void* block, uint32_t size, void** object);
+typedef uint32_t(ZQ_CALL* ZqHeaderWordProc)(void* object);
 typedef struct ZqAttachmentClass {
     ZqClassId classId;
     ZqFlattenedSizeProc flattenedSize;
     ZqFlattenObjectProc flatten;
     ZqCreateObjectProc create;
     ZqDestroyProc destroy;
+    ZqHeaderWordProc headerWord;
+    uint16_t classNumber;
 } ZqAttachmentClass;
 
 /* Registers a class (copied), in place of one with its identifier. Objects of a class that nobody
- * registered are carried as bytes from a flattened image into the next; ZqFindAttachment does not
- * show them. Registering: -1074395269 for a null description or a routine that is missing.
+ * registered are carried as bytes from a flattened image or a file into the next; ZqFindAttachment
+ * does not show them. Registering: -1074395269 for a null description or a routine that is missing.
  * Unregistering a class that is not there does nothing. */
 ZQ_API ZqError ZQ_CALL ZqRegisterAttachmentClass(const ZqAttachmentClass* description);
 ZQ_API ZqError ZQ_CALL ZqUnregisterAttachmentClass(const ZqClassId* classId);

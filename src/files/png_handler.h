@@ -5,14 +5,17 @@
 
 #include "files/handler.h"
 #include "files/png_reader.h"
+#include "files/png_vision.h"
 #include "files/png_writer.h"
 
 namespace zq {
 
 class PngFileHandler final : public ImageFileHandler {
   public:
-    PngFileHandler(std::int32_t type_code, unsigned name_id)
-        : ImageFileHandler(type_code, name_id) {}
+    // `vision` is where vision information goes to and comes from; null: none is read or written.
+    // It must outlive the handler.
+    PngFileHandler(std::int32_t type_code, unsigned name_id, PngVision* vision = nullptr)
+        : ImageFileHandler(type_code, name_id), vision_(vision) {}
 
   protected:
     bool read_header() override;
@@ -25,6 +28,7 @@ class PngFileHandler final : public ImageFileHandler {
     void write_end() override { writer_->write_end(); }
 
   private:
+    PngVision* vision_;
     std::optional<PngReader> reader_;
     std::optional<PngWriter> writer_;
 };

@@ -4,7 +4,7 @@
 #include <cstring>
 
 #include "base/checked.h"
-#include "files/png_chunks.h"
+#include "codecs/deflate.h"
 #include "files/unsigned_grey.h"
 #include "files/write_job.h"
 #include "kernels/colour_rows.h"
@@ -13,37 +13,21 @@ namespace zq {
 
 namespace {
 
-// Deflate cannot grow data by more than this factor.
-constexpr std::uint64_t kMostInflation = 1032;
-
 void read_bytes(png_structp png, png_bytep bytes, std::size_t count) {
     auto* file = static_cast<InputFile*>(png_get_io_ptr(png));
     if (file->read_some(bytes, count) != count) PngSession::fail(png, kUnableToReadData);
 }
 
-// Everything but what a read uses is passed over unread: nothing that a file carries beside its
-// pixels costs memory or can be wrong.
-void choose_chunks(png_structp png) {
+// Everything but the picture is passed over unread: nothing that a file carries beside its pixels
+// costs memory or can be wrong.
+void skip_extras(png_structp png) {
     png_set_keep_unknown_chunks(png, PNG_HANDLE_CHUNK_NEVER, nullptr, -1);
-    png_set_keep_unknown_chunks(png, PNG_HANDLE_CHUNK_ALWAYS, kSampleOffsetChunk.data(), 1);
-}
-
-// The first that stands before the pixels counts.
-std::optional<std::int16_t> find_sample_offset(png_structp png, png_infop info) {
-    png_unknown_chunkp chunks = nullptr;
-    const int count = png_get_unknown_chunks(png, info, &chunks);
-    for (int i = 0; i < count; ++i) {
-        const png_unknown_chunk& chunk = chunks[i];
-        const bool wanted = std::memcmp(chunk.name, kSampleOffsetChunk.data(), 4) == 0;
-        if (!wanted || (chunk.location & PNG_AFTER_IDAT) != 0) continue;
-        if (const auto offset = parse_sample_offset({chunk.data, chunk.size})) return offset;
-    }
-    return std::nullopt;
 }
 
 }  // namespace
 
-PngReader::PngReader(InputFile& file) : file_(file), session_(PngSession::Use::kRead) {}
+PngReader::PngReader(InputFile& file, std::optional<std::int16_t> sample_offset)
+    : file_(file), session_(PngSession::Use::kRead), sample_offset_(sample_offset) {}
 
 void PngReader::read_info() {
     const png_structp png = session_.png();
@@ -51,7 +35,7 @@ void PngReader::read_info() {
     session_.run(kInvalidFileHeader, [this, png, info] {
         png_set_read_fn(png, &file_, read_bytes);
         png_set_sig_bytes(png, kPngSignatureBytes);
-        choose_chunks(png);
+        skip_extras(png);
         png_read_info(png, info);
     });
     width_ = png_get_image_width(png, info);
@@ -60,7 +44,6 @@ void PngReader::read_info() {
     colour_type_ = png_get_color_type(png, info);
     channels_ = png_get_channels(png, info);
     interlaced_ = png_get_interlace_type(png, info) != PNG_INTERLACE_NONE;
-    sample_offset_ = find_sample_offset(png, info);
     check_plausible();
 }
 

@@ -7,17 +7,17 @@
 
 #include "files/input_file.h"
 #include "files/pixel_format.h"
+#include "files/png_extras.h"
 #include "files/png_session.h"
 #include "image/image.h"
 
 namespace zq {
 
-inline constexpr std::size_t kPngSignatureBytes = 8;
-
 class PngReader {
   public:
-    // The file stands behind its signature. It must outlive the reader.
-    explicit PngReader(InputFile& file);
+    // The file stands behind its signature. It must outlive the reader. `sample_offset` is what
+    // the file says that was subtracted from its 16-bit samples.
+    PngReader(InputFile& file, std::optional<std::int16_t> sample_offset);
 
     // All chunks up to the pixels. Throws kInvalidFileHeader, and kUnableToReadData when the file
     // ends early or cannot hold the pixels that it announces.

@@ -5,8 +5,6 @@
 #include <array>
 #include <cstring>
 
-#include "files/png_chunks.h"
-
 namespace zq {
 
 namespace {
@@ -110,27 +108,31 @@ void PngWriter::check(const WriteJob& job) {
     if (pixels.width == 0 || pixels.height == 0) throw kImageTooSmall;
 }
 
-PngWriter::PngWriter(OutputFile& file, const WriteJob& job)
+PngWriter::PngWriter(OutputFile& file, const WriteJob& job, const PngVision* vision)
     : file_(file), job_(job), session_(PngSession::Use::kWrite) {
+    if (vision != nullptr) settings_ = vision->settings;
     choose_layout();
+    chunks_ = make_png_chunks(job.pixels, layout_, vision);
 }
 
 void PngWriter::choose_layout() {
     const PixelView& pixels = job_.pixels;
-    depth_ = pixels.type == PixelType::kI16 || pixels.type == PixelType::kRgbU64 ? 16 : 8;
+    layout_.depth = pixels.type == PixelType::kI16 || pixels.type == PixelType::kRgbU64 ? 16 : 8;
     switch (pixels.type) {
         case PixelType::kU8:
-            colour_type_ = job_.colour_table.empty() ? PNG_COLOR_TYPE_GRAY : PNG_COLOR_TYPE_PALETTE;
-            table_has_alpha_ = std::any_of(job_.colour_table.begin(), job_.colour_table.end(),
-                                           [](std::uint32_t entry) { return entry >> 24 != 0; });
+            layout_.colour_type =
+                job_.colour_table.empty() ? PNG_COLOR_TYPE_GRAY : PNG_COLOR_TYPE_PALETTE;
+            layout_.table_has_alpha =
+                std::any_of(job_.colour_table.begin(), job_.colour_table.end(),
+                            [](std::uint32_t entry) { return entry >> 24 != 0; });
             break;
         case PixelType::kI16:
-            colour_type_ = PNG_COLOR_TYPE_GRAY;
-            sample_offset_ = choose_sample_offset(pixels);
-            if (sample_offset_ != 0) shifted_.resize(static_cast<std::size_t>(pixels.width));
+            layout_.colour_type = PNG_COLOR_TYPE_GRAY;
+            layout_.sample_offset = choose_sample_offset(pixels);
+            if (layout_.sample_offset != 0) shifted_.resize(static_cast<std::size_t>(pixels.width));
             break;
         default:
-            colour_type_ = has_alpha(pixels) ? PNG_COLOR_TYPE_RGB_ALPHA : PNG_COLOR_TYPE_RGB;
+            layout_.colour_type = has_alpha(pixels) ? PNG_COLOR_TYPE_RGB_ALPHA : PNG_COLOR_TYPE_RGB;
             break;
     }
 }
@@ -139,53 +141,35 @@ void PngWriter::choose_layout() {
 
 void PngWriter::set_header() {
     png_set_IHDR(session_.png(), session_.info(), static_cast<png_uint_32>(job_.pixels.width),
-                 static_cast<png_uint_32>(job_.pixels.height), depth_, colour_type_,
+                 static_cast<png_uint_32>(job_.pixels.height), layout_.depth, layout_.colour_type,
                  PNG_INTERLACE_NONE, PNG_COMPRESSION_TYPE_DEFAULT, PNG_FILTER_TYPE_DEFAULT);
-}
-
-void PngWriter::set_palette() {
-    if (colour_type_ != PNG_COLOR_TYPE_PALETTE) return;
-    std::array<png_color, kColourTableSize> palette;
-    std::array<png_byte, kColourTableSize> alpha;
-    for (std::size_t i = 0; i < kColourTableSize; ++i) {
-        const std::uint32_t entry = job_.colour_table[i];
-        palette[i] = {static_cast<png_byte>(entry >> 16), static_cast<png_byte>(entry >> 8),
-                      static_cast<png_byte>(entry)};
-        alpha[i] = static_cast<png_byte>(entry >> 24);
-    }
-    png_set_PLTE(session_.png(), session_.info(), palette.data(), kColourTableSize);
-    if (table_has_alpha_) {
-        png_set_tRNS(session_.png(), session_.info(), alpha.data(), kColourTableSize, nullptr);
-    }
-}
-
-void PngWriter::set_sample_offset() {
-    if (sample_offset_ == 0) return;
-    SampleOffsetBytes bytes = make_sample_offset(static_cast<std::int16_t>(sample_offset_));
-    png_unknown_chunk chunk{};
-    std::memcpy(chunk.name, kSampleOffsetChunk.data(), kSampleOffsetChunk.size());
-    chunk.data = bytes.data();
-    chunk.size = bytes.size();
-    chunk.location = PNG_HAVE_PLTE;  // behind the palette's place and before the pixels
-    png_set_unknown_chunks(session_.png(), session_.info(), &chunk, 1);
 }
 
 void PngWriter::set_compression() {
     PngCompression compression;
     if (job_.options.present) {
-        compression = png_compression(job_.options.words[0], colour_type_, table_has_alpha_);
+        compression =
+            png_compression(job_.options.words[0], layout_.colour_type, layout_.table_has_alpha);
     }
     png_set_compression_level(session_.png(), compression.level);
     png_set_filter(session_.png(), PNG_FILTER_TYPE_BASE, compression.filters);
 }
 
+// libpng writes texts before chunks that it does not know; so it is given neither.
+void PngWriter::write_chunks() {
+    for (const PngChunk& chunk : chunks_) {
+        png_write_chunk(session_.png(), chunk.name.data(), chunk.bytes.data(), chunk.bytes.size());
+    }
+}
+
 void PngWriter::set_transformations() {
     const png_structp png = session_.png();
-    if (depth_ == 16) png_set_swap(png);
-    if ((colour_type_ & PNG_COLOR_MASK_COLOR) == 0 || colour_type_ == PNG_COLOR_TYPE_PALETTE)
+    if (layout_.depth == 16) png_set_swap(png);
+    if ((layout_.colour_type & PNG_COLOR_MASK_COLOR) == 0 ||
+        layout_.colour_type == PNG_COLOR_TYPE_PALETTE)
         return;
     png_set_bgr(png);
-    if (colour_type_ == PNG_COLOR_TYPE_RGB && job_.pixels.packing != Packing::kPacked24) {
+    if (layout_.colour_type == PNG_COLOR_TYPE_RGB && job_.pixels.packing != Packing::kPacked24) {
         png_set_filler(png, 0, PNG_FILLER_AFTER);
     }
 }
@@ -194,10 +178,10 @@ void PngWriter::write_info() {
     session_.run(kUnableToWriteData, [this] {
         png_set_write_fn(session_.png(), &file_, write_bytes, flush_nothing);
         set_header();
-        set_palette();
-        set_sample_offset();
+        set_png_description(session_.png(), session_.info(), job_, layout_, settings_);
         set_compression();
         png_write_info(session_.png(), session_.info());
+        write_chunks();
         set_transformations();
     });
 }
@@ -207,7 +191,7 @@ const std::uint8_t* PngWriter::samples_of_row(std::int32_t y) {
     if (shifted_.empty()) return row;
     const auto* values = reinterpret_cast<const std::int16_t*>(row);
     for (std::size_t x = 0; x < shifted_.size(); ++x) {
-        shifted_[x] = static_cast<std::uint16_t>(values[x] - sample_offset_);
+        shifted_[x] = static_cast<std::uint16_t>(values[x] - layout_.sample_offset);
     }
     return reinterpret_cast<const std::uint8_t*>(shifted_.data());
 }

@@ -5,6 +5,7 @@
 #include <vector>
 
 #include "files/output_file.h"
+#include "files/png_description.h"
 #include "files/png_session.h"
 #include "files/write_job.h"
 
@@ -21,8 +22,9 @@ PngCompression png_compression(std::int32_t setting, int colour_type, bool has_t
 
 class PngWriter {
   public:
-    // Both must outlive the writer.
-    PngWriter(OutputFile& file, const WriteJob& job);
+    // All must outlive the writer; `vision` may be null. Throws kUnableToWriteData for vision
+    // information that no file can hold, kNotEnoughMemory, std::bad_alloc.
+    PngWriter(OutputFile& file, const WriteJob& job, const PngVision* vision);
 
     // Throw the mapped error number.
     void write_info();
@@ -35,19 +37,17 @@ class PngWriter {
   private:
     void choose_layout();
     void set_header();
-    void set_palette();
-    void set_sample_offset();
     void set_compression();
+    void write_chunks();
     void set_transformations();
     const std::uint8_t* samples_of_row(std::int32_t y);
 
     OutputFile& file_;
     const WriteJob& job_;
     PngSession session_;
-    int colour_type_ = 0;
-    int depth_ = 8;
-    bool table_has_alpha_ = false;
-    std::int32_t sample_offset_ = 0;      // subtracted from signed 16-bit values
+    PngLayout layout_;
+    ZqPngSettings settings_{};
+    std::vector<PngChunk> chunks_;
     std::vector<std::uint16_t> shifted_;  // one row less the sample offset; empty when that is 0
 };
 

@@ -47,13 +47,27 @@ void check(ZqError code) {
 // Of a class that nobody registered: carried as it came.
 class OpaqueAttachment final : public Attachment {
   public:
-    explicit OpaqueAttachment(std::span<const std::uint8_t> bytes)
-        : bytes_(bytes.begin(), bytes.end()) {}
+    explicit OpaqueAttachment(std::span<const std::uint8_t> bytes,
+                              const AttachmentOrigin& origin = {})
+        : bytes_(bytes.begin(), bytes.end()), origin_(origin) {}
     std::vector<std::uint8_t> flattened() const override { return bytes_; }
+    std::uint32_t header_word() const override { return origin_.header_word; }
+    std::uint16_t class_number() const override { return origin_.class_number; }
 
   private:
     std::vector<std::uint8_t> bytes_;
+    AttachmentOrigin origin_;
 };
+
+std::unique_ptr<Attachment> make_by_class(const ZqAttachmentClass& known, const ClassId& id,
+                                          std::span<const std::uint8_t> bytes) {
+    // Made first, so that a want of memory can not lose the object.
+    auto attachment = std::make_unique<ForeignAttachment>(id);
+    void* object = nullptr;
+    check(known.create(bytes.data(), checked_narrow<std::uint32_t>(bytes.size()), &object));
+    attachment->own(object, known.destroy);
+    return attachment;
+}
 
 }  // namespace
 
@@ -99,18 +113,38 @@ std::vector<std::uint8_t> ForeignAttachment::flattened() const {
     return bytes;
 }
 
+std::uint32_t ForeignAttachment::header_word() const {
+    const std::optional<ZqAttachmentClass> known = find_class(id_);
+    return known && known->headerWord != nullptr ? known->headerWord(object_) : 0;
+}
+
+std::uint16_t ForeignAttachment::class_number() const {
+    const std::optional<ZqAttachmentClass> known = find_class(id_);
+    return known ? known->classNumber : std::uint16_t{0};
+}
+
 std::unique_ptr<Attachment> make_attachment(const ClassId& id,
                                             std::span<const std::uint8_t> bytes) {
     const std::optional<ZqAttachmentClass> known = find_class(id);
     if (!known) {
         return std::make_unique<OpaqueAttachment>(bytes);
     }
-    // Made first, so that a want of memory can not lose the object.
-    auto attachment = std::make_unique<ForeignAttachment>(id);
-    void* object = nullptr;
-    check(known->create(bytes.data(), checked_narrow<std::uint32_t>(bytes.size()), &object));
-    attachment->own(object, known->destroy);
-    return attachment;
+    return make_by_class(*known, id, bytes);
+}
+
+std::unique_ptr<Attachment> restore_attachment(const ClassId& id,
+                                               std::span<const std::uint8_t> bytes,
+                                               const AttachmentOrigin& origin) {
+    if (const std::optional<ZqAttachmentClass> known = find_class(id)) {
+        try {
+            return make_by_class(*known, id, bytes);
+        } catch (GRLIBError_enum code) {
+            if (code == kNotEnoughMemory) {
+                throw;
+            }
+        }
+    }
+    return std::make_unique<OpaqueAttachment>(bytes, origin);
 }
 
 }  // namespace zq

@@ -34,6 +34,8 @@ class ForeignAttachment final : public Attachment {
     void* object() const { return object_; }
     // By the class's routines; empty while the class is not registered.
     std::vector<std::uint8_t> flattened() const override;
+    std::uint32_t header_word() const override;
+    std::uint16_t class_number() const override;
 
   private:
     ClassId id_;
@@ -45,5 +47,18 @@ class ForeignAttachment final : public Attachment {
 // the class, one that keeps the bytes. The routine may call the host. Throws its code and
 // std::bad_alloc.
 std::unique_ptr<Attachment> make_attachment(const ClassId& id, std::span<const std::uint8_t> bytes);
+
+// What an object was stored with.
+struct AttachmentOrigin {
+    std::uint32_t header_word = 0;
+    std::uint16_t class_number = 0;
+};
+
+// The same for a file, which is read whatever its objects are: one that its class refuses keeps its
+// bytes, too. Such an object is written again as it came. Throws kNotEnoughMemory and
+// std::bad_alloc.
+std::unique_ptr<Attachment> restore_attachment(const ClassId& id,
+                                               std::span<const std::uint8_t> bytes,
+                                               const AttachmentOrigin& origin);
 
 }  // namespace zq

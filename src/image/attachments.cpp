@@ -68,6 +68,13 @@ Attachment* AttachmentList::find(const ClassId& id) const {
     return node == nullptr ? nullptr : node->attachment.get();
 }
 
+void AttachmentList::visit(const Visitor& visitor) const {
+    for (const Link* link = head_.next; link != &head_; link = link->next) {
+        const auto* node = static_cast<const Node*>(link);
+        visitor(node->id, *node->attachment);
+    }
+}
+
 bool AttachmentList::remove(const ClassId& id) {
     Node* node = find_node(id);
     if (node == nullptr) {

@@ -4,6 +4,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <vector>
 
@@ -18,6 +19,10 @@ class Attachment {
     // The object as bytes from which its class can make it again; empty when it can not be carried.
     // Throws kNotEnoughMemory, or whatever code the object's owner gives.
     virtual std::vector<std::uint8_t> flattened() const { return {}; }
+    // What travels beside those bytes: a word of the object's own, and the number of its class, by
+    // which files group objects.
+    virtual std::uint32_t header_word() const { return 0; }
+    virtual std::uint16_t class_number() const { return 0; }
 };
 
 // Extra information: one object a image that holds parts of several kinds.
@@ -51,6 +56,9 @@ class AttachmentList {
     void set(Entry entry) noexcept;
     // Borrowed; null when absent.
     Attachment* find(const ClassId& id) const;
+    // Every object with its class, in the order in which the classes came.
+    using Visitor = std::function<void(const ClassId&, const Attachment&)>;
+    void visit(const Visitor& visitor) const;
     // False when absent.
     bool remove(const ClassId& id);
     void clear();

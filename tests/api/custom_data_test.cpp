@@ -11,12 +11,15 @@
 #include <vector>
 
 #include "refhost/refhost.h"
+#include "tests/support/host_blocks.h"
 #include "tests/support/host_image.h"
 
 namespace {
 
+using zqtest::Block;
 using zqtest::Cluster;
 using zqtest::HostImage;
+using zqtest::Keys;
 using namespace std::string_literals;
 using Texts = std::vector<std::string>;
 
@@ -26,40 +29,10 @@ constexpr ZqError kNullPointer = -1074395269;
 constexpr ZqError kSize = -1074395724;
 constexpr ZqError kKey = -1074395723;
 
-// An array of strings as a host holds it.
-class Keys : public refhost::Owned<ZqStringArrayHandle> {
-  public:
-    ~Keys() {
-        each([](ZqStringHandle string) { refhost::dispose(string); });
-    }
-    Texts texts() const {
-        Texts all;
-        each([&](ZqStringHandle string) { all.push_back(refhost::text(string)); });
-        return all;
-    }
-
-  private:
-    void each(const std::function<void(ZqStringHandle)>& visit) const {
-        for (int32_t i = 0; get() != nullptr && i < (*get())->count; ++i) {
-            visit((*get())->elements[i]);
-        }
-    }
-};
-
 ZqError write(const HostImage& image, const char* key, const std::string& value) {
     return DF_WriteCustomData(&image.value, key, value.data(), static_cast<uint32_t>(value.size()),
                               nullptr);
 }
-
-// A host block without a count.
-class Block : public refhost::Owned<ZqHandle> {
-  public:
-    explicit Block(ZqHandle handle = nullptr) : Owned(handle) {}
-    std::string bytes() const {
-        if (get() == nullptr) return {};
-        return {reinterpret_cast<const char*>(*get()), refhost::handle_size(get()).value()};
-    }
-};
 
 Block block_of(const std::string& text) {
     return Block(reinterpret_cast<ZqHandle>(refhost::new_string(text)));

@@ -416,7 +416,9 @@ struct Attached {
                 [](void* object) {
                     --alive;
                     delete static_cast<Attached*>(object);
-                }};
+                },
+                nullptr,
+                0};
     }
 };
 

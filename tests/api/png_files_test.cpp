@@ -37,12 +37,6 @@ class PngFilesTest : public testing::Test {
         EXPECT_EQ(ZqGetSampleOffset(picture.handle(), &offset), 0);
         return offset;
     }
-    // Puts a chunk in front of the first one of another name.
-    void insert_chunk(const std::string& before, const std::string& chunk) {
-        std::string file = load_bytes(path_);
-        file.insert(file.find(before) - 4, chunk);
-        store_bytes(path_, file);
-    }
 
     zqtest::ScratchFolder folder_;
     std::string path_ = folder_.path("picture.png");
@@ -267,7 +261,7 @@ TEST_F(PngFilesTest, GivesTheSamplesOf16BitFilesBack) {
         BarePng file =
             bare(PNG_COLOR_TYPE_GRAY, 16, static_cast<uint32_t>(c.samples.size()), 1, c.samples);
         zqtest::write_bare_png(path_, file);
-        insert_chunk("IDAT", c.chunk);
+        store_bytes(path_, zqtest::with_chunks(load_bytes(path_), "IDAT", c.chunk));
         Picture target(ZQ_TYPE_U8);
         ASSERT_EQ(read(target), 0);
         EXPECT_EQ(target.pixels(),

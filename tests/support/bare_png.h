@@ -92,16 +92,39 @@ inline std::string png_chunk(const std::string& name, const std::string& bytes) 
     return big_endian(static_cast<uLong>(bytes.size())) + body + big_endian(sum);
 }
 
-// Contents of all chunks of a name, joined; empty when there is none.
-inline std::string chunk_bytes(const std::string& file, const std::string& name) {
-    std::string all;
+struct Chunk {
+    std::string name, bytes;
+};
+
+inline std::vector<Chunk> chunks_of(const std::string& file) {
+    std::vector<Chunk> chunks;
     for (size_t at = 8; at + 12 <= file.size();) {
         size_t length = 0;
         for (size_t i = 0; i < 4; ++i) length = length << 8 | static_cast<uint8_t>(file[at + i]);
-        if (file.compare(at + 4, 4, name) == 0) all += file.substr(at + 8, length);
+        chunks.push_back({file.substr(at + 4, 4), file.substr(at + 8, length)});
         at += length + 12;
     }
+    return chunks;
+}
+
+// Names of all chunks, separated by blanks.
+inline std::string chunk_names(const std::string& file) {
+    std::string names;
+    for (const Chunk& chunk : chunks_of(file)) names += (names.empty() ? "" : " ") + chunk.name;
+    return names;
+}
+
+// Contents of all chunks of a name, joined; empty when there is none.
+inline std::string chunk_bytes(const std::string& file, const std::string& name) {
+    std::string all;
+    for (const Chunk& chunk : chunks_of(file)) all += chunk.name == name ? chunk.bytes : "";
     return all;
+}
+
+// The file with more chunks in front of the first one of a name.
+inline std::string with_chunks(std::string file, const std::string& before,
+                               const std::string& chunks) {
+    return file.insert(file.find(before) - 4, chunks);
 }
 
 }  // namespace zqtest

@@ -13,6 +13,7 @@ struct Session {
 
 void add_info(CLI::App& tool, Session& session);
 void add_convert(CLI::App& tool, Session& session);
+void add_data(CLI::App& tool, Session& session);
 void add_dump(CLI::App& tool, Session& session);
 void add_bayer(CLI::App& tool, Session& session);
 void add_raw(CLI::App& tool, Session& session);

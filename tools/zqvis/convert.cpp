@@ -29,6 +29,7 @@ struct Options {
     std::string tiff_compression;
     std::optional<int32_t> quality;
     std::optional<int32_t> png_compression;
+    bool vision = false;
 };
 
 using Names = std::map<std::string, int32_t, std::less<>>;
@@ -100,7 +101,7 @@ ZqWriteOptions write_options(const Options& options, std::string_view format) {
 // A colour table that the output cannot hold is applied, so that the colours stay right.
 std::unique_ptr<Picture> read(const std::string& path, const Options& options,
                               const Format& format) {
-    auto picture = std::make_unique<Picture>(path);
+    auto picture = options.vision ? Picture::with_vision(path) : std::make_unique<Picture>(path);
     const std::optional<int32_t> type = value_of(kPixelTypes, options.type);
     const bool stays_u8 = type.value_or(ZQ_TYPE_U8) == ZQ_TYPE_U8;
     if (!picture->colour_table().empty() && !(stays_u8 && format.keeps_colour_table))
@@ -112,7 +113,7 @@ std::unique_ptr<Picture> read(const std::string& path, const Options& options,
 void convert(const std::string& file, const Options& options, const Format& format) {
     const Input input(file);
     const std::unique_ptr<Picture> picture = read(input.path(), options, format);
-    write_picture(*picture, {output_of(options, format, file), format.name},
+    write_picture(*picture, {output_of(options, format, file), format.name, options.vision},
                   write_options(options, format.name));
 }
 
@@ -120,6 +121,8 @@ int run(const Options& options, bool quiet) {
     if (options.output.empty() && options.folder.empty())
         refuse_usage("one of -o and --out-dir is needed");
     const Format& format = output_format(options);
+    if (options.vision && std::string_view(format.name) != "PNG")
+        refuse_usage("--vision needs an output of type PNG");
     if (options.folder.empty() && options.files.size() > 1)
         refuse_usage("several files need --out-dir");
     refuse_collisions(options, format);
@@ -157,5 +160,7 @@ void add_convert(CLI::App& tool, Session& session) {
         ->add_option("--png-compression", options->png_compression,
                      "PNG: 0 is the smallest file, 100 is not compressed")
         ->check(CLI::Range(0, 100));
+    command->add_flag("--vision", options->vision,
+                      "Vision information goes along, from PNG to PNG");
     command->callback([options, &session] { session.status = run(*options, session.quiet); });
 }

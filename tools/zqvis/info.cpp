@@ -44,7 +44,12 @@ Json as_json(const std::string& file, const Picture& picture) {
               {"y_step", shortest(facts.y_step)}}},
             {"bit_depth", facts.bit_depth},
             {"sample_offset", facts.sample_offset},
-            {"colour_table_entries", picture.colour_table().size()}};
+            {"colour_table_entries", picture.colour_table().size()},
+            {"custom_keys", picture.keys()},
+            {"vision_bytes",
+             {{"objects", picture.vision_bytes(ZQ_VISION_OBJECTS)},
+              {"private_objects", picture.vision_bytes(ZQ_VISION_PRIVATE_OBJECTS)},
+              {"timing", picture.vision_bytes(ZQ_VISION_TIMING)}}}};
 }
 
 std::string as_text(const std::string& file, const Picture& picture) {
@@ -63,6 +68,15 @@ std::string as_text(const std::string& file, const Picture& picture) {
     line("sample offset", fmt::format("{}", facts.sample_offset));
     const size_t entries = picture.colour_table().size();
     line("colour table", entries == 0 ? "none" : fmt::format("{} entries", entries));
+    for (const std::string& key : picture.keys())
+        line("custom data", fmt::format("{}: {} bytes", key, picture.value(key).size()));
+    const auto objects = [&](const char* name, int32_t part) {
+        const size_t bytes = picture.vision_bytes(part);
+        if (bytes > 0) line(name, fmt::format("{} bytes", bytes));
+    };
+    objects("objects", ZQ_VISION_OBJECTS);
+    objects("private objects", ZQ_VISION_PRIVATE_OBJECTS);
+    objects("timing", ZQ_VISION_TIMING);
     return text;
 }
 
@@ -70,9 +84,9 @@ int run(const Options& options, bool quiet) {
     Json all = Json::array();
     const int status = run_batch(options.files, quiet, [&](const std::string& file) -> std::string {
         const Input input(file);
-        const Picture picture(input.path());
-        if (!options.json) return as_text(file, picture);
-        all.push_back(as_json(file, picture));
+        const auto picture = Picture::with_vision(input.path());
+        if (!options.json) return as_text(file, *picture);
+        all.push_back(as_json(file, *picture));
         return {};
     });
     // File names may be in any encoding; JSON is always UTF-8.

@@ -20,6 +20,7 @@ int run(int argc, char** argv) {
     add_info(tool, session);
     add_convert(tool, session);
     add_dump(tool, session);
+    add_data(tool, session);
     add_bayer(tool, session);
     add_raw(tool, session);
     add_flatten(tool, session);

@@ -26,6 +26,8 @@ const Format& format_of(const OutputFile& output) {
 void write_picture(Picture& picture, const OutputFile& output, const ZqWriteOptions& options) {
     const Format& format = format_of(output);
     write_through_path(output.name, [&](const std::string& path) {
-        check(picture.write(path, format.name, options), name_for_reports(output.name));
+        check(output.vision ? picture.write_with_vision(path, options)
+                            : picture.write(path, format.name, options),
+              name_for_reports(output.name));
     });
 }

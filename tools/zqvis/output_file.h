@@ -10,7 +10,8 @@
 
 struct OutputFile {
     std::string name;
-    std::string format;  // empty: the extension decides
+    std::string format;   // empty: the extension decides
+    bool vision = false;  // PNG with vision information
 };
 
 // Declare -o, which the command cannot do without, and --format.

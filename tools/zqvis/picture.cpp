@@ -1,6 +1,7 @@
 // Pictures over the exported functions.
 #include "picture.h"
 
+#include <zqvissvc/custom_data.h>
 #include <zqvissvc/errors.h>
 #include <zqvissvc/flatten.h>
 #include <zqvissvc/image.h>
@@ -24,6 +25,19 @@ Picture::Picture(const std::string& path) : Picture(ZQ_TYPE_U8, 0, 0) {
                      colour_table_.out()));
     file_type_ = type_name.text();
     file_type_.erase(file_type_.find_last_not_of(' ') + 1);
+}
+
+std::unique_ptr<Picture> Picture::with_vision(const std::string& path) {
+    auto picture = std::make_unique<Picture>(ZQ_TYPE_U8, 0, 0);
+    ZqVisionFile* file = nullptr;
+    check(ZqNewVisionFile(nullptr, &file));
+    picture->vision_ = {file, [](ZqVisionFile* owned) { ZqDisposeVisionFile(owned); }};
+    const ZqError code = ZqReadVisionFile(picture->value_.image, path.c_str(), nullptr,
+                                          picture->colour_table_.out(), file);
+    if (code == ZQ_ERR_UNSUPPORTED_FILE_TYPE) return std::make_unique<Picture>(path);
+    check(code);
+    picture->file_type_ = "PNG";
+    return picture;
 }
 
 Picture::Picture(const Record& record) {
@@ -69,19 +83,20 @@ std::unique_ptr<Picture> Picture::with_colours_applied() const {
             for (const int shift : {0, 8, 16, 24})
                 *target++ = static_cast<uint8_t>(table[index] >> shift);
     }
-    result->copy_attributes(now);
+    result->copy_attributes(*this);
     return result;
 }
 
 std::unique_ptr<Picture> Picture::converted(int32_t type) const {
     auto result = std::make_unique<Picture>(type, 0, 0);
     check(ZqConvertImage(value_.image, result->value_.image));
-    result->copy_attributes(facts());
+    result->copy_attributes(*this);
     return result;
 }
 
 // The bit depth describes 16-bit samples, so it survives only among those.
-void Picture::copy_attributes(const Facts& from) const {
+void Picture::copy_attributes(const Picture& source) {
+    const Facts from = source.facts();
     const auto has_16_bits = [](int32_t type) {
         return type == ZQ_TYPE_I16 || type == ZQ_TYPE_RGBU64;
     };
@@ -93,12 +108,53 @@ void Picture::copy_attributes(const Facts& from) const {
     check(ZqUnlockImages(&value_.image, 1));
     int32_t depth = from.bit_depth;
     if (keep_depth) check(DF_ImageBitDepth2(&value_, 1, &depth, nullptr));
+    vision_ = source.vision_;
+    for (const std::string& key : source.keys()) set_value(key, source.value(key));
+}
+
+std::vector<std::string> Picture::keys() const {
+    refhost::Owned<ZqStringArrayHandle> array;
+    check(DF_EnumerateCustomKeys(&value_, array.out(), nullptr));
+    std::vector<std::string> keys;
+    for (int32_t i = 0; i < (*array.get())->count; ++i) {
+        ZqStringHandle key = (*array.get())->elements[i];
+        keys.push_back(refhost::text(key));
+        refhost::dispose(key);
+    }
+    return keys;
+}
+
+std::string Picture::value(const std::string& key) const {
+    refhost::Owned<ZqHandle> value;
+    uint32_t size = 0;
+    check(DF_ReadCustomData(&value_, key.c_str(), value.out(), &size, nullptr));
+    return {reinterpret_cast<const char*>(*value.get()), size};
+}
+
+void Picture::set_value(const std::string& key, std::string_view value) const {
+    check(DF_WriteCustomData(&value_, key.c_str(), value.data(),
+                             static_cast<uint32_t>(value.size()), nullptr));
+}
+
+void Picture::remove_value(const std::string& key) const {
+    check(DF_RemoveCustomData(&value_, key.c_str(), nullptr));
+}
+
+size_t Picture::vision_bytes(int32_t part) const {
+    uint32_t size = 0;
+    if (vision_ != nullptr) check(ZqGetVisionPart(vision_.get(), part, nullptr, &size));
+    return size;
 }
 
 ZqError Picture::write(const std::string& path, const std::string& file_type,
                        const ZqWriteOptions& options) {
     return DF_WriteFile2(&value_, path.c_str(), file_type.c_str(), colour_table_.out(), &options,
                          nullptr);
+}
+
+ZqError Picture::write_with_vision(const std::string& path, const ZqWriteOptions& options) {
+    return ZqWriteVisionFile(path.c_str(), value_.image, &options, colour_table_.out(),
+                             vision_.get());
 }
 
 std::string Picture::flattened(const Flattening& how) const {

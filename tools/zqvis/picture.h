@@ -47,6 +47,8 @@ class Picture {
     Picture(int32_t type, int32_t width, int32_t height);
     // The file's image, of the type that the file holds.
     explicit Picture(const std::string& path);
+    // The same with the vision information that a PNG holds.
+    static std::unique_ptr<Picture> with_vision(const std::string& path);
     // The flattened image.
     explicit Picture(const Record& record);
     Picture(const Picture&) = delete;
@@ -65,21 +67,32 @@ class Picture {
     // Row y of the image proper, as stored, without padding. Valid while the picture lives.
     std::span<uint8_t> row(int32_t y) const;
 
-    // Each returns a new picture with the same calibration.
+    // The custom data, by its keys.
+    std::vector<std::string> keys() const;
+    std::string value(const std::string& key) const;
+    void set_value(const std::string& key, std::string_view value) const;
+    void remove_value(const std::string& key) const;
+    // Bytes of the objects that hang on the image, as the file held them (ZQ_VISION_...).
+    size_t vision_bytes(int32_t part) const;
+
+    // Each returns a new picture with the same calibration and vision information.
     std::unique_ptr<Picture> with_colours_applied() const;  // RGB, by the colour table
     std::unique_ptr<Picture> converted(int32_t type) const;
 
     // Writes the image with its colour table; returns the library's code.
     ZqError write(const std::string& path, const std::string& file_type,
                   const ZqWriteOptions& options);
+    // The same as PNG, with the vision information.
+    ZqError write_with_vision(const std::string& path, const ZqWriteOptions& options);
 
     // One record, without the colour table.
     std::string flattened(const Flattening& how) const;
 
   private:
-    void copy_attributes(const Facts& from) const;
+    void copy_attributes(const Picture& source);
 
     ZqImageValue value_ = {};
+    std::shared_ptr<ZqVisionFile> vision_;  // null for a picture without
     refhost::ArrayU32 colour_table_;
     std::string file_type_;
 };
