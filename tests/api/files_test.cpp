@@ -122,9 +122,6 @@ TEST_F(FilesTest, TellsWhatTheFileIs) {
     EXPECT_EQ(ZqReadFile(target.handle(), path_.c_str(), nullptr, type.out(), nullptr, nullptr),
               kUnsupported);
     EXPECT_EQ(type.text(), "xxx");
-    const ZqRawParameters raw = {1, 3, 0, 0, {0, 0}, 0};
-    EXPECT_EQ(ZqReadFile(target.handle(), path_.c_str(), &raw, nullptr, nullptr, nullptr),
-              kUnsupported);
     EXPECT_EQ(target.state(), picture.state());
 }
 

@@ -84,20 +84,33 @@ void settle_host() {
     for (int i = 0; i < 5000; ++i) refhost::dispose(refhost::new_string(""));
 }
 
+// What grew in the course of two hundred lives; empty when nothing did.
+std::string growth_in_two_hundred_lives(const std::string& path) {
+    const auto before = zqtest::holdings();
+    for (int round = 0; round < 200; ++round) one_life(round, path);
+    const auto after = zqtest::holdings();
+    std::string grown;
+    for (size_t i = 0; i < before.size(); ++i) {
+        if (after[i].amount <= before[i].amount + before[i].slack) continue;
+        grown += before[i].name + std::string(": ") + std::to_string(before[i].amount) + " to " +
+                 std::to_string(after[i].amount) + "\n";
+    }
+    return grown;
+}
+
+// What a life leaves behind shows every time. The tables of the system's loader grow at first, the
+// more so the more libraries come along with this one.
 TEST(LifeTest, TwoHundredLivesLeaveNothing) {
     settle_host();
     const zqtest::ScratchFolder folder;
     const std::string path = folder.path("life.png");
     for (int round = 0; round < 12; ++round) one_life(round, path);
-    const auto before = zqtest::holdings();
-    for (int round = 0; round < 200; ++round) {
-        one_life(round, path);
-        if (HasFatalFailure()) return;
+    std::string grown;
+    for (int attempt = 0; attempt < 6; ++attempt) {
+        grown = growth_in_two_hundred_lives(path);
+        if (grown.empty() || HasFailure()) break;
     }
-    const auto after = zqtest::holdings();
-    for (size_t i = 0; i < before.size(); ++i) {
-        EXPECT_LE(after[i].amount, before[i].amount + before[i].slack) << before[i].name;
-    }
+    EXPECT_EQ(grown, "");
 }
 
 // Threads that come and go while the library stays loaded.
