@@ -137,6 +137,7 @@ TEST_F(FlattenSettingsTest, StressTemporaryQualityStaysPrivate) {
     ASSERT_EQ(DF_FlattenImageCompression(&codec, &kind, &quality, 1, nullptr), 0);
     std::atomic<int> wrong{0};
     std::vector<std::thread> threads;
+    threads.reserve(kThreads);
     for (int t = 0; t < kThreads; ++t) {
         threads.emplace_back([&, t] {
             const Picture picture(ZQ_TYPE_U8, 40, 40);
@@ -270,6 +271,7 @@ TEST(FlattenHooksTest, StressAPrivateImageInSeveralThreads) {
     const ZqImageValue value = {nullptr, image};
     std::atomic<int> wrong{0};
     std::vector<std::thread> threads;
+    threads.reserve(3);
     for (int t = 0; t < 3; ++t) {
         threads.emplace_back([&, t] {
             for (int i = 0; i < 100; ++i) {

@@ -1,7 +1,9 @@
 // Flattened images taken apart and put together word by word.
 #pragma once
 
+#include <gtest/gtest.h>
 #include <zqvissvc/flatten.h>
+#include <zqvissvc/image.h>
 
 #include <cstdint>
 #include <string>
@@ -106,5 +108,27 @@ inline ZqError unflatten(const std::string& bytes, ZqImageHandle* image) {
     const refhost::String string(bytes);
     return UnflattenImageFromArray1D(image, string.get());
 }
+
+// A record of the image in mode 2.
+inline std::string flattened(ZqImageHandle image, int32_t codec, int32_t kind = 0,
+                             int32_t version = 0x00080000, uint8_t keep_name = 0) {
+    refhost::String string;
+    EXPECT_EQ(FlattenImageToArray1D2(image, string.out(), 2, codec, kind, 900, keep_name, version),
+              0);
+    return string.text();
+}
+
+// An image that a rebuilding made; it goes with the object.
+class Rebuilt {
+  public:
+    explicit Rebuilt(const std::string& bytes) { code = unflatten(bytes, &handle); }
+    ~Rebuilt() { ZqDisposeImage(handle); }
+    Rebuilt(const Rebuilt&) = delete;
+    Rebuilt& operator=(const Rebuilt&) = delete;
+    std::string name() const { return handle->name == nullptr ? "" : handle->name; }
+
+    ZqImageHandle handle = nullptr;
+    ZqError code;
+};
 
 }  // namespace zqtest
