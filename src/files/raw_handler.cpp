@@ -35,7 +35,8 @@ std::size_t RawFileHandler::stride() const {
 void RawFileHandler::seek_to_data() {
     const auto lines = static_cast<std::uint64_t>(target_.height);
     const std::uint64_t bytes = checked_mul<std::uint64_t>(stride(), lines - 1);
-    input().require(static_cast<std::uint64_t>(layout_.offset), checked_add(bytes, line_bytes()));
+    input().require(static_cast<std::uint64_t>(layout_.offset),
+                    checked_add<std::uint64_t>(bytes, line_bytes()));
     input().seek(layout_.offset);
 }
 
