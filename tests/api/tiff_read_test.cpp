@@ -294,6 +294,10 @@ TEST_F(TiffReadTest, RefusesDamagedAndForeignFiles) {
 // A small file cannot hold these pictures, so it is refused before any memory is taken for them:
 // each would need more than an image can have, which would be another error.
 TEST_F(TiffReadTest, RefusesPicturesThatTheFileCannotHold) {
+    // Where sizes have 32 bits the sums in libtiff itself overflow, and the header is refused.
+    const auto is_refusal = [](ZqError code) {
+        return code == kUnreadable || (sizeof(size_t) == 4 && code == kBadHeader);
+    };
     for (const uint32_t compression : {1U, 2U, 4U, 5U, 7U, 8U, 32773U}) {
         SCOPED_TRACE(compression);
         const bool is_fax = compression == 2 || compression == 4;
@@ -302,16 +306,16 @@ TEST_F(TiffReadTest, RefusesPicturesThatTheFileCannotHold) {
         store(file);
         Picture target(ZQ_TYPE_U8, 2, 2);
         const std::string before = target.state();
-        EXPECT_EQ(read(target), kUnreadable);
+        EXPECT_PRED1(is_refusal, read(target));
         // The same as one tile, which the picture hardly touches.
         BareTiff tile = with_field(with_field(file, 256, {16}), 257, {16});
         tile.tiled = true;
         tile.fields[322].values = tile.fields[323].values = {60000};
         store(tile);
-        EXPECT_EQ(read(target), kUnreadable);
+        EXPECT_PRED1(is_refusal, read(target));
         store(with_field(with_field(file, 256, {0xFFFFFFFF}), 257, {0x7FFFFFFF}));
         const ZqError code = read(target);
-        EXPECT_TRUE(code == kUnreadable || code == kNoMemory) << code;
+        EXPECT_TRUE(is_refusal(code) || code == kNoMemory) << code;
         EXPECT_EQ(target.state(), before);
     }
 }
