@@ -37,6 +37,21 @@ struct PixelView {
     const std::uint8_t* row(std::int32_t y) const { return first + y * stride; }
 };
 
+// Formats that other programs read hold grey and colour of whole numbers. Throws
+// kIncompatibleImageType for other pixels, kImageTooSmall for none.
+inline void check_interchangeable(const PixelView& pixels) {
+    switch (pixels.type) {
+        case PixelType::kU8:
+        case PixelType::kI16:
+        case PixelType::kRgb:
+        case PixelType::kRgbU64:
+            break;
+        default:
+            throw kIncompatibleImageType;
+    }
+    if (pixels.width == 0 || pixels.height == 0) throw kImageTooSmall;
+}
+
 // Borrowed: valid while the image keeps its shape.
 inline PixelView view_of(const Image& image) {
     const ImageRecord& record = image.record();

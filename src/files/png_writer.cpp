@@ -96,16 +96,7 @@ void PngWriter::check(const WriteJob& job) {
     const PixelView& pixels = job.pixels;
     const std::int32_t setting = job.options.words[0];
     if (job.options.present && (setting < 0 || setting > kLargestSetting)) throw kInvalidParameter;
-    switch (pixels.type) {
-        case PixelType::kU8:
-        case PixelType::kI16:
-        case PixelType::kRgb:
-        case PixelType::kRgbU64:
-            break;
-        default:
-            throw kIncompatibleImageType;
-    }
-    if (pixels.width == 0 || pixels.height == 0) throw kImageTooSmall;
+    check_interchangeable(pixels);
 }
 
 PngWriter::PngWriter(OutputFile& file, const WriteJob& job, const PngVision* vision)

@@ -101,16 +101,7 @@ std::optional<Resolution> resolution_of(const Calibration& calibration) {
 
 void TiffWriter::check(const WriteJob& job) {
     const PixelView& pixels = job.pixels;
-    switch (pixels.type) {
-        case PixelType::kU8:
-        case PixelType::kI16:
-        case PixelType::kRgb:
-        case PixelType::kRgbU64:
-            break;
-        default:
-            throw kIncompatibleImageType;
-    }
-    if (pixels.width == 0 || pixels.height == 0) throw kImageTooSmall;
+    check_interchangeable(pixels);
     const std::uint16_t compression = compression_of(job.options);
     const bool jpeg = compression == COMPRESSION_JPEG && may_be_jpeg(job);
     if (!jpeg && !is_lossless(compression)) throw kInvalidFileFormat;

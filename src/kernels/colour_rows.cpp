@@ -14,33 +14,36 @@ namespace zq::HWY_NAMESPACE {
 
 namespace hn = hwy::HWY_NAMESPACE;
 
-void rgb_to_bgra(const std::uint8_t* HWY_RESTRICT source, std::uint8_t* HWY_RESTRICT destination,
-                 std::size_t pixels) {
+// Widens three bytes a pixel, whose first is red or blue, as far as whole vectors go; returns the
+// pixels that are done.
+template <bool kRedFirst>
+HWY_INLINE std::size_t widen_to_bgra([[maybe_unused]] const std::uint8_t* HWY_RESTRICT source,
+                                     [[maybe_unused]] std::uint8_t* HWY_RESTRICT destination,
+                                     [[maybe_unused]] std::size_t pixels) {
     std::size_t done = 0;
 #if HWY_TARGET != HWY_SCALAR
     const hn::ScalableTag<std::uint8_t> tag;
     const auto alpha = hn::Zero(tag);
     for (; done + hn::Lanes(tag) <= pixels; done += hn::Lanes(tag)) {
-        auto red = alpha, green = alpha, blue = alpha;
-        hn::LoadInterleaved3(tag, source + 3 * done, red, green, blue);
+        auto first = alpha, green = alpha, last = alpha;
+        hn::LoadInterleaved3(tag, source + 3 * done, first, green, last);
+        const auto blue = kRedFirst ? last : first;
+        const auto red = kRedFirst ? first : last;
         hn::StoreInterleaved4(blue, green, red, alpha, tag, destination + 4 * done);
     }
 #endif
+    return done;
+}
+
+void rgb_to_bgra(const std::uint8_t* HWY_RESTRICT source, std::uint8_t* HWY_RESTRICT destination,
+                 std::size_t pixels) {
+    const std::size_t done = widen_to_bgra<true>(source, destination, pixels);
     scalar::rgb_to_bgra(source + 3 * done, destination + 4 * done, pixels - done);
 }
 
 void bgr_to_bgra(const std::uint8_t* HWY_RESTRICT source, std::uint8_t* HWY_RESTRICT destination,
                  std::size_t pixels) {
-    std::size_t done = 0;
-#if HWY_TARGET != HWY_SCALAR
-    const hn::ScalableTag<std::uint8_t> tag;
-    const auto alpha = hn::Zero(tag);
-    for (; done + hn::Lanes(tag) <= pixels; done += hn::Lanes(tag)) {
-        auto blue = alpha, green = alpha, red = alpha;
-        hn::LoadInterleaved3(tag, source + 3 * done, blue, green, red);
-        hn::StoreInterleaved4(blue, green, red, alpha, tag, destination + 4 * done);
-    }
-#endif
+    const std::size_t done = widen_to_bgra<false>(source, destination, pixels);
     scalar::bgr_to_bgra(source + 3 * done, destination + 4 * done, pixels - done);
 }
 
