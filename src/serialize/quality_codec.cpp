@@ -6,9 +6,10 @@
 #include <algorithm>
 #include <cstring>
 
-#include "serialize/quality_jpeg.h"
-#include "serialize/quality_planes.h"
+#include "serialize/quality_choice.h"
+#include "serialize/quality_payload.h"
 #include "serialize/quality_stream.h"
+#include "serialize/quality_touches.h"
 
 namespace zq {
 
@@ -22,10 +23,6 @@ constexpr std::size_t kSumAt = 20;
 
 bool has_pixels(const Image& image) {
     return image.record().width > 0 && image.record().height > 0;
-}
-
-bool is_jpeg_type(PixelType type) {
-    return type == PixelType::kU8 || type == PixelType::kRgb;
 }
 
 // At least what the image takes in the library's own row layout.
@@ -106,18 +103,23 @@ void rebuild_border(const Image& image) {
     }
 }
 
+// The touches come first, as nothing can fail any more when pixels change.
+void put_pixels(Bytes& block, const Image& image, int quality) {
+    QualityChoice choice = choose_quality(image, quality);
+    put_touches(block, image, choice.errors, quality);
+    if (choice.payload) {
+        put_bytes(block, *choice.payload);
+    } else {
+        put_payload(block, image, choice.quality);
+    }
+}
+
 }  // namespace
 
 std::vector<std::uint8_t> compress_pixels(const Image& image, int quality) {
     const int used = std::clamp(quality, 1, 100);
     Bytes block = start_block(image, used);
-    if (has_pixels(image)) {
-        if (is_jpeg_type(image.type())) {
-            put_jpeg(block, image, used);
-        } else {
-            put_planes_of(block, image, used);
-        }
-    }
+    if (has_pixels(image)) put_pixels(block, image, used);
     const std::size_t payload = block.size() - kHeader;
     store_le32(block.data() + kLengthAt, checked_narrow<std::uint32_t>(payload));
     store_le32(block.data() + kSumAt, check_sum(block, payload));
@@ -132,11 +134,9 @@ void decompress_pixels(Image& image, std::span<const std::uint8_t> block, PixelM
         reader.expect_end();
         return;
     }
-    if (is_jpeg_type(image.type())) {
-        read_jpeg(reader, image, memory);
-    } else {
-        read_planes_of(reader, image);
-    }
+    const auto touches = read_touches(reader, image);
+    read_payload(reader, image, memory);
+    apply_touches(touches, image);
     rebuild_border(image);
 }
 

@@ -56,6 +56,7 @@ class StreamReader {
     std::uint32_t u32() { return load_le32(bytes(4).data()); }
     float f32() { return std::bit_cast<float>(u32()); }
     std::span<const std::uint8_t> section() { return bytes(u32()); }
+    bool at_end() const { return left_.empty(); }
     void expect_end() const {
         if (!left_.empty()) throw kInitializationError;
     }

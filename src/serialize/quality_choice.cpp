@@ -1,0 +1,209 @@
+// Trials: encode, decode, compare.
+#include "serialize/quality_choice.h"
+
+#include <algorithm>
+#include <cmath>
+#include <cstdlib>
+#include <cstring>
+
+#include "serialize/quality_payload.h"
+
+namespace zq {
+
+namespace {
+
+constexpr std::int64_t kMostWhole = std::int64_t{1} << 17;
+constexpr std::int32_t kSampleWidth = 1024;
+constexpr std::int32_t kSampleHeight = 64;
+constexpr std::int32_t kBlock = 8;  // JPEG blocks come out the same wherever they stand
+
+// How far back lower qualities are tried: `least_back`, and farther while the error does not fall
+// as evenly as it does in photographs, until it is `far` times the best.
+constexpr int kMostBack = 32;
+struct Evenness {
+    double least_ratio, most_ratio;  // from one quality to the next
+    double far;
+    int least_back;
+};
+constexpr Evenness kJpeg = {1, 1.3, 2, 2};
+constexpr Evenness kWavelets = {1.015, 1.12, 8, 4};
+// What a sample says of the whole is not exact.
+constexpr double kSampleMargin = 0.98;
+
+double square(double value) {
+    return value * value;
+}
+
+template <class Sample, std::size_t kSamples>
+double squared_distance(const std::uint8_t* a, const std::uint8_t* b) {
+    Sample left[kSamples];
+    Sample right[kSamples];
+    std::memcpy(left, a, sizeof(left));
+    std::memcpy(right, b, sizeof(right));
+    double sum = 0;
+    for (std::size_t i = 0; i < kSamples; ++i) {
+        sum += square(static_cast<double>(left[i]) - static_cast<double>(right[i]));
+    }
+    return std::isfinite(sum) ? sum : 0;  // what is not finite is kept exactly
+}
+
+double squared_hsl_distance(const std::uint8_t* a, const std::uint8_t* b) {
+    const int hue = std::abs(a[2] - b[2]);
+    return squared_distance<std::uint8_t, 2>(a, b) + square(std::min(hue, 256 - hue));
+}
+
+using Distance = double (*)(const std::uint8_t*, const std::uint8_t*);
+Distance distance_of(PixelType type) {
+    switch (type) {
+        case PixelType::kU8:
+            return squared_distance<std::uint8_t, 1>;
+        case PixelType::kI16:
+            return squared_distance<std::int16_t, 1>;
+        case PixelType::kSgl:
+            return squared_distance<float, 1>;
+        case PixelType::kComplex:
+            return squared_distance<float, 2>;
+        case PixelType::kRgb:
+            return squared_distance<std::uint8_t, 3>;
+        case PixelType::kHsl:
+            return squared_hsl_distance;
+        default:
+            return squared_distance<std::uint16_t, 3>;
+    }
+}
+
+// The image itself, or a small picture of parts of it: for JPEG four strips of whole blocks, spread
+// from the top left to the bottom right; else one rectangle from the middle.
+class Sample {
+  public:
+    explicit Sample(const Image& image) : image_(image), part_(Variant::kPrivate, {}) {
+        const ImageRecord& record = image.record();
+        if (std::int64_t{record.width} * record.height <= kMostWhole) return;
+        const std::int32_t width = std::min(record.width, kSampleWidth);
+        const std::int32_t height = std::min(record.height / kBlock * kBlock, kSampleHeight);
+        if (height == 0) return;
+        is_whole_ = false;
+        strips_ = is_jpeg_type(image.type()) && height == kSampleHeight ? 4 : 1;
+        strip_height_ = height / strips_;
+        part_.reinitialise({.type = record.type, .width = width, .height = height, .border = 0});
+        copy();
+    }
+
+    bool is_whole() const { return is_whole_; }
+    const Image& picture() const { return is_whole_ ? image_ : part_; }
+    std::uint64_t index_of(std::int32_t x, std::int32_t y) const {
+        const auto width = static_cast<std::uint64_t>(image_.record().width);
+        if (is_whole_) return static_cast<std::uint64_t>(y) * width + static_cast<std::uint64_t>(x);
+        const Corner corner = corner_of(y / strip_height_);
+        return static_cast<std::uint64_t>(corner.y + y % strip_height_) * width +
+               static_cast<std::uint64_t>(corner.x + x);
+    }
+
+  private:
+    struct Corner {
+        std::int32_t x, y;
+    };
+
+    Corner corner_of(std::int32_t strip) const {
+        const auto at = [&](std::int32_t room) {
+            const std::int64_t middle = std::int64_t{room} * (2 * strip + 1) / (2 * strips_);
+            return static_cast<std::int32_t>(middle / kBlock * kBlock);
+        };
+        return {at(image_.record().width - part_.record().width),
+                at(image_.record().height - strip_height_)};
+    }
+
+    void copy() const {
+        const std::ptrdiff_t pixel = bytes_per_pixel(image_.type());
+        const auto line = static_cast<std::size_t>(part_.record().width * pixel);
+        for (std::int32_t y = 0; y < part_.record().height; ++y) {
+            const Corner corner = corner_of(y / strip_height_);
+            std::memcpy(part_.row(y), image_.row(corner.y + y % strip_height_) + corner.x * pixel,
+                        line);
+        }
+    }
+
+    const Image& image_;
+    Image part_;
+    bool is_whole_ = true;
+    std::int32_t strips_ = 1;
+    std::int32_t strip_height_ = 1;
+};
+
+class Trials {
+  public:
+    explicit Trials(const Sample& sample) : sample_(sample), result_(Variant::kPrivate, {}) {
+        const ImageRecord& record = sample.picture().record();
+        result_.reinitialise(
+            {.type = record.type, .width = record.width, .height = record.height, .border = 0});
+    }
+
+    // The total squared error; the best quality so far is kept, of equal ones the first.
+    double attempt(int quality) {
+        Bytes payload;
+        put_payload(payload, sample_.picture(), quality);
+        StreamReader reader(payload);
+        read_payload(reader, result_, PixelMemory::kUsed);
+        const double total = measure();
+        if (best_.quality == 0 || total < margin_ * best_total_) {
+            best_total_ = total;
+            best_.quality = quality;
+            best_.errors.swap(errors_);
+            if (sample_.is_whole()) best_.payload = std::move(payload);
+        }
+        return total;
+    }
+
+    double best_total() const { return best_total_; }
+    QualityChoice take() { return std::move(best_); }
+
+  private:
+    double measure() {
+        const Image& picture = sample_.picture();
+        const Distance distance = distance_of(picture.type());
+        const std::ptrdiff_t pixel = bytes_per_pixel(picture.type());
+        errors_.clear();
+        double total = 0;
+        for (std::int32_t y = 0; y < picture.record().height; ++y) {
+            const std::uint8_t* from = picture.row(y);
+            const std::uint8_t* back = result_.row(y);
+            for (std::int32_t x = 0; x < picture.record().width; ++x) {
+                const double squared = distance(from + x * pixel, back + x * pixel);
+                if (squared == 0) continue;
+                total += squared;
+                errors_.push_back({sample_.index_of(x, y), squared});
+            }
+        }
+        return total;
+    }
+
+    const Sample& sample_;
+    const double margin_ = sample_.is_whole() ? 1 : kSampleMargin;
+    Image result_;
+    std::vector<PixelError> errors_;
+    QualityChoice best_{};
+    double best_total_ = 0;
+};
+
+}  // namespace
+
+QualityChoice choose_quality(const Image& image, int quality) {
+    const Sample sample(image);
+    Trials trials(sample);
+    double above = trials.attempt(quality);
+    const bool is_jpeg = is_jpeg_type(image.type());
+    // Steps of JPEG divide so that large pictures do not get worse.
+    if (is_jpeg && !sample.is_whole()) return trials.take();
+    const Evenness& limits = is_jpeg ? kJpeg : kWavelets;
+    bool is_even = true;
+    for (int back = 1; back <= kMostBack && back < quality && trials.best_total() > 0; ++back) {
+        const double total = trials.attempt(quality - back);
+        is_even =
+            is_even && total > limits.least_ratio * above && total < limits.most_ratio * above;
+        if (is_even ? back >= limits.least_back : total > limits.far * trials.best_total()) break;
+        above = total;
+    }
+    return trials.take();
+}
+
+}  // namespace zq

@@ -1,0 +1,21 @@
+// Single pixels that are told exactly, so that of two qualities with the same steps the higher one
+// is still truer.
+#pragma once
+
+#include <span>
+
+#include "image/image.h"
+#include "serialize/quality_choice.h"
+#include "serialize/quality_stream.h"
+
+namespace zq {
+
+// Writes a section of pixels that take a part of the squared error away. The part grows with the
+// quality (1 to 100). `errors` is used up.
+void put_touches(Bytes& out, const Image& image, std::span<PixelError> errors, int quality);
+
+// The next section, checked; throws kInitializationError.
+std::span<const std::uint8_t> read_touches(StreamReader& reader, const Image& image);
+void apply_touches(std::span<const std::uint8_t> touches, const Image& image);
+
+}  // namespace zq
