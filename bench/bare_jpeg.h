@@ -8,8 +8,13 @@
 
 namespace zqbench {
 
-// Bytes before the first JPEG stream in a block of the quality codec.
-inline constexpr std::size_t kJpegStart = 28;
+// Bytes before the first JPEG stream in a block of the quality codec: its header, the section of
+// touches (a length and as many bytes) and the length of the stream.
+inline std::size_t jpeg_start(std::span<const std::uint8_t> block) {
+    const std::size_t touches = block[24] | std::size_t{block[25]} << 8 |
+                                std::size_t{block[26]} << 16 | std::size_t{block[27]} << 24;
+    return 24 + 4 + touches + 4;
+}
 
 // Rows of 8-bit grey, or of blue, green, red, filler. `stride` is in bytes.
 struct JpegRows {

@@ -68,8 +68,9 @@ class Flattening {
     }
     std::span<const uint8_t> jpeg() const {
         const ZqString& record = **record_.get();
-        return std::span(record.bytes, static_cast<size_t>(record.length))
-            .subspan(kRecordHeader + zqbench::kJpegStart);
+        const auto block =
+            std::span(record.bytes, static_cast<size_t>(record.length)).subspan(kRecordHeader);
+        return block.subspan(zqbench::jpeg_start(block));
     }
 
   private:

@@ -52,7 +52,7 @@ zqbench::JpegRows rows_of(const zq::Image& image) {
 }
 
 std::span<const std::uint8_t> stream_of(const std::vector<std::uint8_t>& block) {
-    return std::span(block).subspan(zqbench::kJpegStart);
+    return std::span(block).subspan(zqbench::jpeg_start(block));
 }
 
 zq::Image& picture(std::int32_t type) {

@@ -13,8 +13,11 @@ namespace zq {
 namespace {
 
 constexpr std::int64_t kMostWhole = std::int64_t{1} << 17;
-constexpr std::int32_t kSampleWidth = 1024;
-constexpr std::int32_t kSampleHeight = 64;
+struct SampleShape {
+    std::int32_t width, height, strips;
+};
+constexpr SampleShape kJpegSample = {1024, 32, 4};
+constexpr SampleShape kWaveletSample = {256, 256, 1};
 constexpr std::int32_t kBlock = 8;  // JPEG blocks come out the same wherever they stand
 
 // How far back lower qualities are tried: `least_back`, and farther while the error does not fall
@@ -79,11 +82,12 @@ class Sample {
     explicit Sample(const Image& image) : image_(image), part_(Variant::kPrivate, {}) {
         const ImageRecord& record = image.record();
         if (std::int64_t{record.width} * record.height <= kMostWhole) return;
-        const std::int32_t width = std::min(record.width, kSampleWidth);
-        const std::int32_t height = std::min(record.height / kBlock * kBlock, kSampleHeight);
+        const SampleShape& shape = is_jpeg_type(image.type()) ? kJpegSample : kWaveletSample;
+        const std::int32_t width = std::min(record.width, shape.width);
+        const std::int32_t height = std::min(record.height / kBlock * kBlock, shape.height);
         if (height == 0) return;
         is_whole_ = false;
-        strips_ = is_jpeg_type(image.type()) && height == kSampleHeight ? 4 : 1;
+        strips_ = height == shape.height ? shape.strips : 1;
         strip_height_ = height / strips_;
         part_.reinitialise({.type = record.type, .width = width, .height = height, .border = 0});
         copy();
