@@ -128,7 +128,7 @@ Jpeg2000Samples samples_of(const WriteJob& job, bool plain) {
 int resolutions_of(const PixelView& pixels) {
     constexpr int kMost = 6;
     const auto shorter = static_cast<std::uint32_t>(std::min(pixels.width, pixels.height));
-    return std::min<int>(kMost, std::bit_width(shorter));
+    return std::min(kMost, static_cast<int>(std::bit_width(shorter)));
 }
 
 opj_cparameters_t parameters_of(const WriteJob& job, const Jpeg2000Samples& layout,
