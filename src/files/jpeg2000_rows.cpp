@@ -76,13 +76,13 @@ void ycc_to_rgb_samples(const std::array<SampleRow, 3>& rows, std::size_t count,
     const auto most = static_cast<float>((1 << bits) - 1),
                middle = static_cast<float>(1 << bits) / 2;
     const auto sample = [most](float value) {
-        return static_cast<std::int32_t>(std::clamp(value, 0.0F, most) + 0.5F);
+        return static_cast<std::int32_t>(std::clamp(value, 0.0F, most + 0.5F));
     };
     std::int32_t* __restrict red = rows[0];
     std::int32_t* __restrict green = rows[1];
     std::int32_t* __restrict blue = rows[2];
     for (std::size_t i = 0; i < count; ++i) {
-        const auto luminance = static_cast<float>(red[i]);
+        const float luminance = static_cast<float>(red[i]) + 0.5F;  // so that truncation rounds
         const float cb = static_cast<float>(green[i]) - middle;
         const float cr = static_cast<float>(blue[i]) - middle;
         red[i] = sample(luminance + 1.402F * cr);

@@ -146,7 +146,7 @@ TEST_F(Jpeg2000WriteTest, GetsBetterWithTheQuality) {
         const size_t channels = type == ZQ_TYPE_RGB || type == ZQ_TYPE_RGBU64 ? 4 : 1;
         for (size_t i = 0, n = 0; i < pixels.size(); i += wide ? 2 : 1, ++n) {
             const double x = static_cast<double>(n / channels % 128),
-                         y = static_cast<double>(n / channels) / 128;
+                         y = static_cast<double>(n) / static_cast<double>(128 * channels);
             const double noise = static_cast<double>(n * 2654435761U % 1024) / 1024 - 0.5;
             const double wave = 0.5 + 0.4 * std::sin(0.2 * x) * std::cos(0.13 * y) + 0.15 * noise;
             const int value = channels == 4 && n % 4 == 3 ? 0 : static_cast<int>(most * wave);
