@@ -96,8 +96,9 @@ inline void read_target(const std::uint8_t* bytes, std::size_t size, Reader read
     zq::FileContents contents;
     const GRLIBError_enum code = read(reader, file.path(), target, contents);
     if (code != kSuccess) {
-        constexpr std::array known = {kNotEnoughMemory, kInvalidFileHeader, kFileIo,
-                                      kUnsupportedFileType, kUnableToReadData};
+        constexpr std::array known = {kNotEnoughMemory,     kInvalidFileHeader, kFileIo,
+                                      kUnsupportedFileType, kUnableToReadData,  kColourSpaceMethod,
+                                      kMoreThanOneLayer};
         require(std::find(known.begin(), known.end(), code) != known.end(), "a known code");
         require(state_of(target) == before, "a target left alone");
         return;

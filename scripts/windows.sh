@@ -14,8 +14,10 @@ package() {
     mkdir -p dist "$stage/$name"
     cmake --install "build/win$1" --prefix "$stage/$name" --strip >/dev/null
     mkdir -p "$stage/$name/licenses"
-    cp "$(mingw_prefix "$2")"/share/licenses/{zlib,libpng1.6,highway,cli11,fmtlib,nlohmann-json3} \
-        "$stage/$name/licenses/"
+    local part
+    for part in zlib libpng1.6 libjpeg-turbo tiff openjpeg2 highway cli11 fmtlib nlohmann-json3; do
+        cp "$(mingw_prefix "$2")/share/licenses/$part" "$stage/$name/licenses/"
+    done
     (cd "$stage" && cmake -E tar cf "$OLDPWD/dist/$name.zip" --format=zip "$name")
     echo "dist/$name.zip"
 }

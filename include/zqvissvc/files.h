@@ -3,8 +3,10 @@
  * Types by code and name: 0 "BMP" (U8 with or without colour table, RGB without alpha), 1 "AIPD"
  * (the native format: every pixel type, lossless), 2 "TIFF" (U8 with or without colour table, I16,
  * RGB and RGB (U64) without alpha), 3 "JPEG" (U8, RGB without alpha), 4 "PNG" (U8 with or without
- * colour table, I16, RGB, RGB (U64)). Names are compared without regard to letter case; leading
- * white space is skipped, blanks behind the name and characters after the eighth do not count.
+ * colour table, I16, RGB, RGB (U64)), 7 "JPEG2000" (as PNG; a path that ends in .j2k, .j2c or .jpc
+ * gets the code stream alone, without colour table or alpha). Names are compared without regard to
+ * letter case; leading white space is skipped, blanks behind the name and characters after the
+ * eighth do not count.
  *
  * Paths are zero-terminated, in the encoding of the C run-time. Writing never leaves a half-written
  * file over a good one: the new file is made beside the old one and takes its place when it is
@@ -14,8 +16,10 @@
  * Codes of reading and writing: -1074395995 file not found, -1074395992 access denied, -1074395994
  * too many files open, -1074395983 disk full, -1074395993 any other failure of the system (a file
  * too short to be probed, too), -1074395991 no such type, or a file of a type that nobody
- * recognises, -1074396000 bad file header, -1074395989 file cut short or damaged, -1074395988
- * header not written, -1074396159 no memory, or a picture of more than 2147483647 bytes.
+ * recognises, -1074396000 bad file header, -1074395974 and -1074395973 a JPEG 2000 file of colours
+ * that nothing here can show, or of more than one quality layer, -1074395989 file cut short or
+ * damaged, -1074395988 header not written, -1074396159 no memory, or a picture of more than
+ * 2147483647 bytes.
  *
  * Threads: any; an image is locked for the whole call. */
 #ifndef ZQVISSVC_FILES_H
@@ -32,10 +36,15 @@ ZQ_BEGIN_C
  *           compression of colour and else none, 6 to 9 all. The default is level 6 with all.
  *           JPEG: quality, 0 to 1000, else -1074395997; the default is 750. It is libjpeg's scale
  *           of 1 to 100 in tenths, rounded (0 to 14 are 1). Colours have half the resolution in
- * both directions below 900. words[1]  other formats' parameters; 0. words[2]  TIFF: compression. 0
- * none, 2 JPEG (U8 without colour table and RGB, lossy), 4 PackBits, 5 deflate (tag 32946); of any
- * other value the low 16 bits are the tag itself: 1 none, 5 LZW (as 0x10005), 8 deflate. Another
- * tag, or JPEG of another picture: -1074395986. */
+ * both directions below 900.
+ *           JPEG2000: quality, 0 to 1000, else -1074395997; 1000 keeps everything. Without options,
+ *           and with a colour table, the file is lossless.
+ * words[1]  JPEG2000: 1 lossless whatever the quality, 0 not, else -1074395997. Others: 0.
+ * words[2]  JPEG2000: wavelet, 0 chosen, 1 integer, 2 float, else -1074395953; float and lossless
+ *           exclude each other (-1074396060).
+ *           TIFF: compression. 0 none, 2 JPEG (U8 without colour table and RGB, lossy), 4 PackBits,
+ * 5 deflate (tag 32946); of any other value the low 16 bits are the tag itself: 1 none, 5 LZW (as
+ * 0x10005), 8 deflate. Another tag, or JPEG of another picture: -1074395986. */
 typedef struct ZqWriteOptions {
     int32_t present;
     int32_t words[3];
@@ -64,16 +73,15 @@ typedef struct ZqRawParameters {
  * path         borrowed; empty or null: -1074395997.
  * fileType     borrowed; a name from above.
  * colourTable  borrowed; null, or an array of 0 or 256 entries 0xAARRGGBB (else -1074395976), 256
- *              for U8 images only (else -1074396082). PNG keeps it, TIFF all but alpha; AIPD has no
- *              place for it.
- * options      borrowed; may be null.
- * -1074396077 when the type cannot hold the image's pixel type, -1074396154 for a BMP, JPEG, PNG or
- * TIFF without pixels, -1074396074 for a BMP of 4 GiB and more and for a JPEG with a side above
- * 65500 pixels, -1074395986 for a TIFF compression that does not fit. TIFF holds I16 with negative
- * values as signed samples, and takes its resolution from a calibration in inches (unit 8),
- * centimetres (4) or metres (5). It cannot go to a pipe. After a failure the path holds what it
- * held before; only a new AIPD file whose header could not be written (-1074395988) stays as far as
- * it went. */
+ *              for U8 images only (else -1074396082). PNG and JPEG2000 keep it, TIFF all but alpha;
+ * AIPD has no place for it. options      borrowed; may be null. -1074396077 when the type cannot
+ * hold the image's pixel type, -1074396154 for a BMP, JPEG, PNG, TIFF or JPEG 2000 file without
+ * pixels, -1074396074 for a BMP of 4 GiB and more and for a JPEG with a side above 65500 pixels,
+ * -1074395986 for a TIFF compression that does not fit and for a colour table of a JPEG 2000 code
+ * stream. TIFF holds I16 with negative values as signed samples, and takes its resolution from a
+ * calibration in inches (unit 8), centimetres (4) or metres (5). It cannot go to a pipe. After a
+ * failure the path holds what it held before; only a new AIPD file whose header could not be
+ * written (-1074395988) stays as far as it went. */
 ZQ_API ZqError ZQ_CALL DF_WriteFile2(const ZqImageValue* image, const char* path,
                                      const char* fileType, ZqArrayU32Handle* colourTable,
                                      const ZqWriteOptions* options, ZqErrorCluster* error);

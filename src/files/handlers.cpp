@@ -7,6 +7,7 @@
 
 #include "files/aipd_handler.h"
 #include "files/bmp_handler.h"
+#include "files/jpeg2000_handler.h"
 #include "files/jpeg_handler.h"
 #include "files/png_handler.h"
 #include "files/tiff_handler.h"
@@ -26,6 +27,7 @@ constexpr std::array kHandlers = {
     HandlerEntry{2, 171, make<TiffFileHandler>, true, true},
     HandlerEntry{3, 190, make<JpegFileHandler>, true, true},
     HandlerEntry{4, 191, make<PngFileHandler>, true, true},
+    HandlerEntry{7, 40365, make<Jpeg2000FileHandler>, true, true},
 };
 
 // The letters of type names are ASCII; the process's locale must not matter.

@@ -3,7 +3,8 @@
 
 #include <algorithm>
 #include <array>
-#include <cstring>
+
+#include "files/alpha_in_use.h"
 
 namespace zq {
 
@@ -19,29 +20,6 @@ void write_bytes(png_structp png, png_bytep bytes, std::size_t count) {
 
 // The stream is flushed at the end, where a failure is seen.
 void flush_nothing(png_structp) {}
-
-template <class Channel>
-bool row_has_alpha(const std::uint8_t* row, std::int32_t width) {
-    Channel all = 0;
-    for (std::int32_t x = 0; x < width; ++x) {
-        Channel alpha;
-        std::memcpy(&alpha,
-                    row + (std::size_t{4} * static_cast<std::size_t>(x) + 3) * sizeof(Channel),
-                    sizeof(alpha));
-        all = static_cast<Channel>(all | alpha);
-    }
-    return all != 0;
-}
-
-bool has_alpha(const PixelView& pixels) {
-    if (pixels.packing != Packing::kNative) return false;
-    const auto row_test = pixels.type == PixelType::kRgbU64 ? row_has_alpha<std::uint16_t>
-                                                            : row_has_alpha<std::uint8_t>;
-    for (std::int32_t y = 0; y < pixels.height; ++y) {
-        if (row_test(pixels.row(y), pixels.width)) return true;
-    }
-    return false;
-}
 
 struct Range {
     std::int32_t lowest;

@@ -14,7 +14,7 @@ namespace zq {
 // The caller's option words; absent ones leave each format its defaults.
 struct WriteOptions {
     bool present = false;
-    std::array<std::int32_t, 3> words{};  // the first: PNG compression setting, JPEG quality
+    std::array<std::int32_t, 3> words{};  // what they mean is each writer's to say
 
     static WriteOptions from(const ZqWriteOptions* options) {
         if (options == nullptr || options->present == 0) return {};

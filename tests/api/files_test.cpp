@@ -79,11 +79,13 @@ TEST_F(FilesTest, PicksTheTypeByItsCode) {
     Picture picture(ZQ_TYPE_U8, 5, 4);
     for (int32_t code = -1; code <= 8; ++code) {
         SCOPED_TRACE(code);
-        const ZqError expected = code >= 0 && code <= 4 ? 0 : kUnsupported;
+        const ZqError expected = (code >= 0 && code <= 4) || code == 7 ? 0 : kUnsupported;
         EXPECT_EQ(ZqWriteFileByCode(path_.c_str(), picture.handle(), nullptr, code, nullptr),
                   expected);
     }
-    EXPECT_EQ(load_bytes(path_).substr(0, 4), "\x89PNG");
+    EXPECT_EQ(load_bytes(path_).substr(4, 4), "jP  ");
+    EXPECT_EQ(write(picture, path_, "jpeg2000x"), 0);
+    EXPECT_EQ(load_bytes(path_).substr(4, 4), "jP  ");
 }
 
 TEST_F(FilesTest, RefusesWhatItCannotOpen) {
@@ -129,7 +131,7 @@ TEST_F(FilesTest, TellsWhatTheFileIs) {
 TEST_F(FilesTest, KeepsTheImageWhenAnOutputFails) {
     Picture picture(ZQ_TYPE_U8, 5, 4), same_shape(ZQ_TYPE_U8, 5, 4), other_shape(ZQ_TYPE_RGB, 2, 2);
     picture.fill(9);
-    for (const char* type : {"BMP", "AIPD", "TIFF", "JPEG", "PNG"}) {
+    for (const char* type : {"BMP", "AIPD", "TIFF", "JPEG", "PNG", "JPEG2000"}) {
         ASSERT_EQ(write(picture, path_, type), 0);
         for (Picture* target : {&same_shape, &other_shape}) {
             const std::string before = target->state();
@@ -209,7 +211,7 @@ TEST_F(FilesTest, RefusedWriteKeepsTheOldFile) {
 TEST_F(FilesTest, ReadingALentImageNeedsItsShape) {
     Picture picture(ZQ_TYPE_U8, 5, 4), target(ZQ_TYPE_U8, 5, 4), other(ZQ_TYPE_U8, 5, 5);
     picture.fill(3);
-    for (const char* type : {"BMP", "AIPD", "TIFF", "PNG"}) {
+    for (const char* type : {"BMP", "AIPD", "TIFF", "PNG", "JPEG2000"}) {
         ASSERT_EQ(write(picture, path_, type), 0);
         for (Picture* lent : {&target, &other}) {
             const ZqImageValue value = lent->value();
@@ -230,7 +232,7 @@ TEST_F(FilesTest, RefusesEveryTruncationAndKeepsTheImage) {
     grey.at<int16_t>(0, 0) = -5;  // so that the sample offset's chunk is there
     const std::array<ZqError, 4> known = {kBadHeader, kFileIo, kUnsupported, kUnreadable};
     for (Picture* picture : {&grey, &colour}) {
-        for (const char* type : {"BMP", "AIPD", "TIFF", "PNG"}) {
+        for (const char* type : {"BMP", "AIPD", "TIFF", "PNG", "JPEG2000"}) {
             if (picture == &grey && type[0] == 'B') continue;  // no 16 bits
             ASSERT_EQ(write(*picture, path_, type), 0);
             picture->fill(77);

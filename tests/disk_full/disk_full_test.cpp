@@ -35,7 +35,7 @@ class FileSizeLimit {
 
 TEST(DiskFull, KeepsTheOldFileAndLeavesNoOther) {
     zqtest::Picture picture(ZQ_TYPE_U8, 600, 500);
-    for (const char* type : {"AIPD", "PNG", "BMP", "JPEG", "TIFF"}) {
+    for (const char* type : {"AIPD", "PNG", "BMP", "JPEG", "TIFF", "JPEG2000"}) {
         for (const rlim_t limit : {0, 100, 511, 512, 513, 70000, 100000}) {
             for (const bool existed : {false, true}) {
                 SCOPED_TRACE(testing::Message() << type << ' ' << limit << ' ' << existed);
@@ -69,6 +69,7 @@ TEST(DiskFull, ToldByADevice) {
     EXPECT_EQ(write(picture, "BMP"), kDiskFull);
     EXPECT_EQ(write(picture, "JPEG"), kDiskFull);
     EXPECT_EQ(write(picture, "TIFF"), kDiskFull);
+    EXPECT_EQ(write(picture, "JPEG2000"), kDiskFull);
     EXPECT_EQ(write(small, "PNG"), kDiskFull) << "seen at the end, when the stream is flushed";
     EXPECT_EQ(access("/dev/full", F_OK), 0) << "a device is never removed";
 }

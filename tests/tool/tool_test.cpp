@@ -118,6 +118,8 @@ TEST(Tool, KeepsColoursRight) {
                   {"convert @palette.png -o @applied.aipd", 0, IsEmpty(), IsEmpty()},
                   {"convert @palette.png -o @rgb64.aipd --type rgb64", 0, IsEmpty(), IsEmpty()},
                   {"convert @deep.png -o @deep_again.png", 0, IsEmpty(), IsEmpty()},
+                  {"convert @palette.png -o @kept.jp2", 0, IsEmpty(), IsEmpty()},
+                  {"convert @palette.png -o @applied.JPC", 0, IsEmpty(), IsEmpty()},
               });
     EXPECT_EQ(folder.dump("palette.png"), std::string("\0\1\1", 3));
     const zqtest::BarePng kept = zqtest::read_bare_png(folder.path("kept.png"));
@@ -127,6 +129,8 @@ TEST(Tool, KeepsColoursRight) {
     EXPECT_EQ(kept.palette.at(1).red, 0);
     EXPECT_EQ(folder.dump("applied.aipd"), std::string("\0\0\xFF\0\0\xFF\0\0\0\xFF\0\0", 12));
     EXPECT_EQ(folder.dump("rgb64.aipd").size(), 3U * 8U);
+    EXPECT_EQ(folder.dump("kept.jp2"), folder.dump("palette.png"));
+    EXPECT_EQ(folder.dump("applied.JPC"), folder.dump("applied.aipd"));
     const zqtest::BarePng deep = zqtest::read_bare_png(folder.path("deep_again.png"));
     EXPECT_EQ(deep.rows.at(0), (std::vector<uint8_t>{0, 0, 0x9C, 0x40}));
 }
@@ -141,7 +145,11 @@ TEST(Tool, ConvertsPixelTypesAndPassesOptionsOn) {
                   {"convert @even.png -o @small.png --png-compression 0", 0, IsEmpty(), IsEmpty()},
                   {"convert @even.png -o @large --format png --png-compression 100", 0, IsEmpty(),
                    IsEmpty()},
+                  {"convert @rgb.png -o @fine --format jpeg2000", 0, IsEmpty(), IsEmpty()},
+                  {"convert @rgb.png -o @poor.jp2 --quality 0", 0, IsEmpty(), IsEmpty()},
               });
+    EXPECT_EQ(folder.dump("fine"), folder.dump("rgb.png"));
+    EXPECT_NE(folder.dump("poor.jp2"), folder.dump("rgb.png"));
     EXPECT_EQ(folder.dump("deep.aipd").size(), 2U * 2U);
     EXPECT_LT(folder.bytes("small.png").size(), 1000U);
     EXPECT_GT(folder.bytes("large").size(), 256U * 64U);

@@ -9,17 +9,23 @@
 namespace {
 
 constexpr std::array kFormats = {
-    Format{"BMP", ".bmp", true},  Format{"AIPD", ".aipd", false},
-    Format{"TIFF", ".tif", true}, Format{"JPEG", ".jpg", false},
-    Format{"PNG", ".png", true},  Format{"JPEG2000", ".jp2", false},
+    Format{"BMP", ".bmp", true},
+    Format{"AIPD", ".aipd", false},
+    Format{"TIFF", ".tif", true},
+    Format{"JPEG", ".jpg", false},
+    Format{"PNG", ".png", true},
+    Format{"JPEG2000", ".jp2", true},
+    // The plain code stream: of the same name, after the one that stands for it.
+    Format{"JPEG2000", ".j2k", false},
 };
 
 struct Alias {
     const char* extension;
-    const char* name;
+    const char* usual;
 };
-constexpr std::array kAliases = {Alias{".tiff", "TIFF"}, Alias{".jpeg", "JPEG"},
-                                 Alias{".apd", "AIPD"}};
+constexpr std::array kAliases = {Alias{".tiff", ".tif"}, Alias{".jpeg", ".jpg"},
+                                 Alias{".apd", ".aipd"}, Alias{".j2c", ".j2k"},
+                                 Alias{".jpc", ".j2k"}};
 
 char lower(char c) {
     return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
@@ -33,8 +39,8 @@ bool equal_but_for_case(std::string_view a, std::string_view b) {
 
 std::vector<std::string> format_names() {
     std::vector<std::string> names;
-    names.reserve(kFormats.size());
-    for (const Format& format : kFormats) names.emplace_back(format.name);
+    for (const Format& format : kFormats)
+        if (find_format(format.name) == &format) names.emplace_back(format.name);
     return names;
 }
 
@@ -45,10 +51,12 @@ const Format* find_format(std::string_view name) {
 }
 
 const Format* format_of_path(const std::string& path) {
-    const std::string extension = std::filesystem::path(path).extension().string();
-    for (const Format& format : kFormats)
-        if (equal_but_for_case(format.extension, extension)) return &format;
+    const std::string given = std::filesystem::path(path).extension().string();
+    std::string_view extension = given;
     for (const Alias& alias : kAliases)
-        if (equal_but_for_case(alias.extension, extension)) return find_format(alias.name);
-    return nullptr;
+        if (equal_but_for_case(alias.extension, given)) extension = alias.usual;
+    const auto* const found = std::ranges::find_if(kFormats, [extension](const Format& format) {
+        return equal_but_for_case(format.extension, extension);
+    });
+    return found == kFormats.end() ? nullptr : found;
 }

@@ -1,0 +1,155 @@
+// Reading JPEG 2000. OpenJPEG decodes the code stream alone; boxes are none of its business.
+#include "files/jpeg2000_reader.h"
+
+#include <algorithm>
+#include <array>
+
+#include "files/unsigned_grey.h"
+
+namespace zq {
+
+namespace {
+
+std::int64_t divide_up(std::int64_t a, std::int64_t b) {
+    return (a + b - 1) / b;
+}
+
+// Where the sample of a component lies that covers a sample of another; the first and last ones
+// serve for what lies beyond.
+class Covering {
+  public:
+    Covering(std::uint32_t start, std::uint32_t main_step, std::uint32_t step, OPJ_UINT32 count)
+        : main_step_(main_step),
+          step_(step),
+          main_first_(divide_up(start, main_step)),
+          first_(divide_up(start, step)),
+          last_(std::int64_t{count} - 1) {}
+
+    std::size_t operator()(std::int64_t main) const {
+        const std::int64_t position = (main_first_ + main) * main_step_;
+        const std::int64_t sample = position / step_ - first_;
+        return static_cast<std::size_t>(std::clamp<std::int64_t>(sample, 0, last_));
+    }
+
+  private:
+    std::int64_t main_step_, step_, main_first_, first_, last_;
+};
+
+}  // namespace
+
+bool Jpeg2000Reader::read_info() {
+    if (!read_jpeg2000_layout(file_, layout_)) return false;
+    source_.emplace(file_, layout_.stream.start, layout_.stream.length);
+    stream_ = source_->open();
+    codec_.reset(opj_create_decompress(OPJ_CODEC_J2K));
+    if (!codec_) throw kNotEnoughMemory;
+    opj_dparameters_t parameters;
+    opj_set_default_decoder_parameters(&parameters);
+    opj_image_t* image = nullptr;
+    // Strict: OpenJPEG would fill in what a damaged stream lacks.
+    const bool done = opj_setup_decoder(codec_.get(), &parameters) == OPJ_TRUE &&
+                      opj_decoder_set_strict_mode(codec_.get(), OPJ_TRUE) == OPJ_TRUE &&
+                      opj_read_header(stream_.get(), codec_.get(), &image) == OPJ_TRUE;
+    samples_.reset(image);
+    if (!done) throw kInvalidFileHeader;
+    return true;
+}
+
+void Jpeg2000Reader::decode() {
+    const bool done = opj_decode(codec_.get(), stream_.get(), samples_.get()) == OPJ_TRUE &&
+                      opj_end_decompress(codec_.get(), stream_.get()) == OPJ_TRUE;
+    codec_.reset();
+    if (!done || samples_->numcomps != layout_.stream.components.size()) throw kUnableToReadData;
+    for (const std::size_t index : layout_.colours) check_component(index);
+    if (layout_.alpha_kind != Jpeg2000Alpha::kNone) check_component(layout_.alpha);
+}
+
+void Jpeg2000Reader::check_component(std::size_t index) const {
+    const opj_image_comp_t& samples = samples_->comps[index];
+    const Jpeg2000Component& component = layout_.stream.components[index];
+    if (samples.data == nullptr || samples.w != layout_.stream.width(component) ||
+        samples.h != layout_.stream.height(component)) {
+        throw kUnableToReadData;
+    }
+}
+
+// As many samples as the picture is wide; where the component has fewer, `wide` holds them.
+SampleRow Jpeg2000Reader::row_of(std::size_t index, std::int32_t y,
+                                 std::vector<std::int32_t>& wide) const {
+    const opj_image_comp_t& samples = samples_->comps[index];
+    const Jpeg2000Component& own = layout_.stream.components[index];
+    const Jpeg2000Component& main = layout_.main_component();
+    if (own.dx == main.dx && own.dy == main.dy)
+        return samples.data + static_cast<std::size_t>(y) * samples.w;
+    const Jpeg2000Grid& grid = layout_.stream.grid;
+    const Covering column(grid.left, main.dx, own.dx, samples.w);
+    const Covering line(grid.top, main.dy, own.dy, samples.h);
+    const std::int32_t* const row = samples.data + line(y) * samples.w;
+    wide.resize(static_cast<std::size_t>(layout_.width()));
+    for (std::size_t x = 0; x < wide.size(); ++x)
+        wide[x] = row[column(static_cast<std::int64_t>(x))];
+    return wide.data();
+}
+
+void Jpeg2000Reader::read_grey(Image& image) const {
+    const Jpeg2000Component& component = layout_.main_component();
+    const auto width = static_cast<std::size_t>(layout_.width());
+    const bool indices = !layout_.colour_table.empty();
+    bool above_signed = false;
+    std::vector<std::int32_t> unused;
+    for (std::int32_t y = 0; y < layout_.height(); ++y) {
+        const SampleRow row = row_of(layout_.colours[0], y, unused);
+        if (image.type() == PixelType::kU8) {
+            if (!indices) spread_samples(row, width, component.bits, 8);
+            samples_to_bytes(row, image.row(y), width);
+        } else {
+            samples_to_words(row, reinterpret_cast<std::uint16_t*>(image.row(y)), width);
+            above_signed = above_signed || any_above_signed(image.row(y), width * 2);
+        }
+    }
+    image.set_sample_offset(0);
+    if (component.is_signed || !above_signed) return;
+    shift_unsigned_samples(image, kWholeRangeOffset);
+    image.set_sample_offset(kWholeRangeOffset);
+}
+
+void Jpeg2000Reader::read_colour(Image& image) const {
+    const auto width = static_cast<std::size_t>(layout_.width());
+    const int bits = layout_.main_component().bits;
+    const int wanted = image.type() == PixelType::kRgb ? 8 : 16;
+    const bool alpha = layout_.alpha_kind != Jpeg2000Alpha::kNone;
+    const bool premultiplied = layout_.alpha_kind == Jpeg2000Alpha::kPremultiplied;
+    // Grey with alpha has one row for all.
+    const std::size_t rows = layout_.colours[1] == layout_.colours[0] ? 1 : 3;
+    std::array<std::vector<std::int32_t>, 4> wide;
+    const auto finish = [&](auto* to, const std::array<SampleRow, 3>& rgb, SampleRow opacity) {
+        samples_to_colour(rgb, opacity, to, width);
+        if (premultiplied) divide_by_alpha(to, width);
+    };
+    for (std::int32_t y = 0; y < layout_.height(); ++y) {
+        std::array<SampleRow, 3> rgb;
+        for (std::size_t i = 0; i < rgb.size(); ++i)
+            rgb[i] = i < rows ? row_of(layout_.colours[i], y, wide[i]) : rgb[0];
+        if (layout_.is_ycc && rows == 3) ycc_to_rgb_samples(rgb, width, bits);
+        for (std::size_t i = 0; i < rows; ++i) spread_samples(rgb[i], width, bits, wanted);
+        const SampleRow opacity = alpha ? row_of(layout_.alpha, y, wide[3]) : nullptr;
+        if (alpha)
+            spread_samples(opacity, width, layout_.stream.components[layout_.alpha].bits, wanted);
+        if (wanted == 8) {
+            finish(image.row(y), rgb, opacity);
+        } else {
+            finish(reinterpret_cast<std::uint16_t*>(image.row(y)), rgb, opacity);
+        }
+    }
+}
+
+void Jpeg2000Reader::read_pixels(Image& image) {
+    decode();
+    if (layout_.is_grey()) {
+        read_grey(image);
+    } else {
+        read_colour(image);
+    }
+}
+
+}  // namespace zq
