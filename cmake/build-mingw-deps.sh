@@ -127,7 +127,7 @@ if begin zlib; then
 fi
 # Its fast code is for 64 bits; builds for 32 bits inflate with zlib.
 if [[ $arch == x86_64 ]] && begin libisal; then
-    run make -C "$src" -f Makefile.unx -j "$jobs" arch=mingw units="crc igzip" lib
+    run make -C "$src" -f Makefile.unx -j "$jobs" arch=mingw AS=nasm units="crc igzip" lib
     run install -D -m644 "$src/bin/isa-l.a" "$prefix/lib/libisal.a"
     run install -D -m644 -t "$prefix/include/isa-l" "$src"/include/{igzip_lib,types}.h
     finish lib/libisal.a include/isa-l/igzip_lib.h

@@ -4,8 +4,8 @@
 #include <algorithm>
 #include <bit>
 #include <cmath>
-#include <cstring>
 
+#include "base/byte_order.h"
 #include "codecs/huffman_code.h"
 
 namespace zq {
@@ -251,18 +251,14 @@ void DeflateBlocks::put_stored(std::span<const std::uint8_t> plain, bool is_last
 
 // Eight bytes are stored at once; those that are no bits yet are stored again.
 void DeflateBlocks::put_tokens(std::span<const DeflateToken> tokens, const Codes& codes) {
-    std::size_t at = out_.size();
-    out_.resize(at + tokens.size() * kMostTokenBytes + 2 * sizeof(std::uint64_t));
-    std::uint8_t* bytes = out_.data();
+    const std::size_t start = out_.size();
+    out_.resize(start + tokens.size() * kMostTokenBytes + 2 * sizeof(std::uint64_t));
+    std::uint8_t* at = out_.data() + start;
     std::uint64_t bits = bits_;
     int held = held_;
     const auto store = [&] {
-        std::array<std::uint8_t, 8> word;
-        for (std::size_t i = 0; i < word.size(); ++i) {
-            word[i] = static_cast<std::uint8_t>(bits >> (8 * i));
-        }
-        std::memcpy(bytes + at, word.data(), word.size());
-        at += static_cast<std::size_t>(held / 8);
+        store_le64(at, bits);
+        at += held / 8;
         bits >>= held / 8 * 8;
         held %= 8;
     };
@@ -270,24 +266,32 @@ void DeflateBlocks::put_tokens(std::span<const DeflateToken> tokens, const Codes
         bits |= more << held;
         held += count;
     };
-    for (const DeflateToken token : tokens) {
-        const std::uint32_t value = token.value();
-        if (!token.is_match()) {
-            add(codes.literals[value], codes.literal_lengths[value]);
+    const auto add_symbol = [&](std::size_t symbol) {
+        add(codes.literals[symbol], codes.literal_lengths[symbol]);
+    };
+    for (std::size_t i = 0; i < tokens.size(); ++i) {
+        const std::uint32_t value = tokens[i].value();
+        if (!tokens[i].is_match()) {
+            add_symbol(value);
+            // Three literals fit into a word.
+            for (int more = 0; more < 2 && i + 1 < tokens.size() && !tokens[i + 1].is_match();
+                 ++more) {
+                add_symbol(tokens[++i].value());
+            }
             store();
             continue;
         }
         const Class& length = kLengths[value];
-        add(codes.literals[257U + length.symbol], codes.literal_lengths[257U + length.symbol]);
+        add_symbol(257U + length.symbol);
         add(value - length.first, length.extra_bits);
-        const std::size_t symbol = distance_symbol(token.distance());
+        const std::size_t symbol = distance_symbol(tokens[i].distance());
         add(codes.distances[symbol], codes.distance_lengths[symbol]);
-        add(token.distance() - first_distance(symbol), distance_extra_bits(symbol));
+        add(tokens[i].distance() - first_distance(symbol), distance_extra_bits(symbol));
         store();
     }
-    add(codes.literals[DeflateCounts::kEnd], codes.literal_lengths[DeflateCounts::kEnd]);
+    add_symbol(DeflateCounts::kEnd);
     store();
-    out_.resize(at);
+    out_.resize(static_cast<std::size_t>(at - out_.data()));
     bits_ = bits & ((std::uint64_t{1} << held) - 1);
     held_ = held;
 }

@@ -129,19 +129,29 @@ void RowDeflater::tokenize(std::size_t end) {
     while (at_ < end) {
         Match match = find(at_);
         if (match.gain <= 0) {
-            add(DeflateToken::literal(window_[at_]), 1);
+            pass_literals(end);
             continue;
         }
+        missed_ = 0;
         while (match.length < effort_.lazy && at_ + 1 < end) {
             const Match next = find(at_ + 1);
             if (next.gain <= match.gain) break;
             add(DeflateToken::literal(window_[at_]), 1);
             match = next;
         }
+        const std::size_t start = at_;
         add(DeflateToken::match(match.length, match.distance), match.length);
         const std::size_t last = std::min(at_, filled_ - std::min(filled_, sizeof(std::uint64_t)));
+        remembered_ = std::max(remembered_, start);
         while (remembered_ < last) remember(remembered_);
     }
+}
+
+// The longer nothing was found, the fewer positions are looked at.
+void RowDeflater::pass_literals(std::size_t end) {
+    constexpr std::size_t kPatience = 64, kMostPassed = 4;
+    const std::size_t passed = std::min({1 + missed_++ / kPatience, kMostPassed, end - at_});
+    for (std::size_t i = 0; i < passed; ++i) add(DeflateToken::literal(window_[at_]), 1);
 }
 
 // Puts a position into the tables; how far back the last one with the same hash is, in numbers that

@@ -39,6 +39,7 @@ class RowDeflater {
 
     void deflate(bool is_last);
     void tokenize(std::size_t end);
+    void pass_literals(std::size_t end);
     Match find(std::size_t at);
     void weigh(std::size_t at, std::size_t length, std::size_t distance, Match& best) const;
     std::size_t remember(std::size_t at);
@@ -59,6 +60,7 @@ class RowDeflater {
     std::size_t filled_ = 0;
     std::size_t at_ = 0;         // the next byte to be told
     std::size_t remembered_ = 0;  // the next position that goes into the tables
+    std::size_t missed_ = 0;      // positions without a match in a row
     std::uint32_t base_ = 1;     // position in the stream of the window's first byte, modulo 2^32
     std::vector<std::uint32_t> heads_;      // by hash: the last position
     std::vector<std::uint32_t> previous_;  // by position: the one before with the same hash
