@@ -12,7 +12,7 @@ die() { printf 'dev: %s\n' "$*" >&2; exit 1; }
 
 # ---- Debian packages
 
-kLibraries=(zlib1g-dev libpng-dev libjpeg62-turbo-dev libtiff-dev libhwy-dev libgtest-dev libgmock-dev libbenchmark-dev
+kLibraries=(zlib1g-dev libisal-dev libpng-dev libjpeg62-turbo-dev libtiff-dev libhwy-dev libgtest-dev libgmock-dev libbenchmark-dev
     libcli11-dev libfmt-dev nlohmann-json3-dev)
 kTools=(git cmake ninja-build ccache g++ binutils)
 kCross=(nasm dpkg-dev g++-mingw-w64-x86-64-posix g++-mingw-w64-i686-posix)

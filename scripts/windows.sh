@@ -16,6 +16,7 @@ package() {
     mkdir -p "$stage/$name/licenses"
     cp "$(mingw_prefix "$2")"/share/licenses/{zlib,libpng1.6,highway,cli11,fmtlib,nlohmann-json3} \
         "$stage/$name/licenses/"
+    [[ $1 == 32 ]] || cp "$(mingw_prefix "$2")/share/licenses/libisal" "$stage/$name/licenses/"
     (cd "$stage" && cmake -E tar cf "$OLDPWD/dist/$name.zip" --format=zip "$name")
     echo "dist/$name.zip"
 }

@@ -98,7 +98,8 @@ void fold(std::span<const std::uint8_t> lengths, Header& header) {
     }
 }
 
-Header make_header(std::span<const std::uint8_t> literals, std::span<const std::uint8_t> distances) {
+Header make_header(std::span<const std::uint8_t> literals,
+                   std::span<const std::uint8_t> distances) {
     Header header;
     header.literals = literals.size();
     while (header.literals > 257 && literals[header.literals - 1] == 0) --header.literals;
@@ -183,7 +184,8 @@ struct DeflateBlocks::Codes {
             costs.literals[i] = cost(literal_lengths[i], kRareLiteral);
         }
         for (std::size_t i = kShortestMatch; i <= kLongestMatch; ++i) {
-            const std::uint8_t symbol = cost(literal_lengths[257U + kLengths[i].symbol], kRareLiteral);
+            const std::uint8_t symbol =
+                cost(literal_lengths[257U + kLengths[i].symbol], kRareLiteral);
             costs.lengths[i] = static_cast<std::uint8_t>(symbol + kLengths[i].extra_bits);
         }
         for (std::size_t i = 0; i < costs.distances.size(); ++i) {

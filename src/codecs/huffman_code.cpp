@@ -47,8 +47,7 @@ Depths count_depths(const Leaves& leaves, std::size_t used, std::size_t longest)
     for (std::size_t made = used; made < nodes; ++made) {
         counts[made] = 0;
         for (int child = 0; child < 2; ++child) {
-            const bool take_leaf =
-                leaf < used && (inner == made || counts[leaf] <= counts[inner]);
+            const bool take_leaf = leaf < used && (inner == made || counts[leaf] <= counts[inner]);
             const std::size_t taken = take_leaf ? leaf++ : inner++;
             counts[made] += counts[taken];
             parents[taken] = static_cast<std::uint16_t>(made);

@@ -21,8 +21,8 @@ constexpr std::size_t kHashed = 6;       // bytes; the shortest match at any dis
 constexpr std::size_t kShortestRun = 4;  // the shortest of one byte repeated
 constexpr std::size_t kChunk = 8192;     // tokens
 constexpr std::size_t kMostTokens = 16 * kChunk;
-constexpr double kHeaderBits = 700;  // of a block, roughly
-constexpr std::size_t kWeighed = 32;     // literals of a match that are summed up one by one
+constexpr double kHeaderBits = 700;   // of a block, roughly
+constexpr std::size_t kWeighed = 32;  // literals of a match that are summed up one by one
 
 std::uint64_t load(const std::uint8_t* bytes) {
     std::uint64_t word;

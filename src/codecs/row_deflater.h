@@ -58,11 +58,11 @@ class RowDeflater {
 
     std::vector<std::uint8_t> window_;
     std::size_t filled_ = 0;
-    std::size_t at_ = 0;         // the next byte to be told
+    std::size_t at_ = 0;          // the next byte to be told
     std::size_t remembered_ = 0;  // the next position that goes into the tables
     std::size_t missed_ = 0;      // positions without a match in a row
-    std::uint32_t base_ = 1;     // position in the stream of the window's first byte, modulo 2^32
-    std::vector<std::uint32_t> heads_;      // by hash: the last position
+    std::uint32_t base_ = 1;      // position in the stream of the window's first byte, modulo 2^32
+    std::vector<std::uint32_t> heads_;     // by hash: the last position
     std::vector<std::uint32_t> previous_;  // by position: the one before with the same hash
 
     // The block so far, and the chunk behind it that may become one of its own.

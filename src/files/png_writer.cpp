@@ -1,9 +1,13 @@
-// Writing PNG. libpng turns rows from the layout of the image's type into the file's.
+// Writing PNG: libpng's chunks, and rows in the layout of the file. Unfiltered rows are libpng's to
+// compress.
 #include "files/png_writer.h"
 
 #include <algorithm>
 #include <array>
 #include <cstring>
+
+#include "kernels/colour_rows.h"
+#include "kernels/png_samples.h"
 
 namespace zq {
 
@@ -136,14 +140,15 @@ void PngWriter::set_header() {
                  PNG_INTERLACE_NONE, PNG_COMPRESSION_TYPE_DEFAULT, PNG_FILTER_TYPE_DEFAULT);
 }
 
+PngCompression PngWriter::compression() const {
+    if (!job_.options.present) return {};
+    return png_compression(job_.options.words[0], layout_.colour_type, layout_.table_has_alpha);
+}
+
 void PngWriter::set_compression() {
-    PngCompression compression;
-    if (job_.options.present) {
-        compression =
-            png_compression(job_.options.words[0], layout_.colour_type, layout_.table_has_alpha);
-    }
-    png_set_compression_level(session_.png(), compression.level);
-    png_set_filter(session_.png(), PNG_FILTER_TYPE_BASE, compression.filters);
+    const PngCompression chosen = compression();
+    png_set_compression_level(session_.png(), chosen.level);
+    png_set_filter(session_.png(), PNG_FILTER_TYPE_BASE, chosen.filters);
 }
 
 // libpng writes texts before chunks that it does not know; so it is given neither.
@@ -175,6 +180,11 @@ void PngWriter::write_info() {
         write_chunks();
         set_transformations();
     });
+    if (!PngPixelWriter::suits(compression())) return;
+    const std::size_t step = png_get_channels(session_.png(), session_.info()) *
+                             static_cast<std::size_t>(layout_.depth / 8);
+    pixels_.emplace(session_, compression(), static_cast<std::size_t>(job_.pixels.width) * step,
+                    step);
 }
 
 const std::uint8_t* PngWriter::samples_of_row(std::int32_t y) {
@@ -187,7 +197,39 @@ const std::uint8_t* PngWriter::samples_of_row(std::int32_t y) {
     return reinterpret_cast<const std::uint8_t*>(shifted_.data());
 }
 
+// In the file's layout.
+void PngWriter::put_row(std::int32_t y, std::uint8_t* to) {
+    const std::uint8_t* from = samples_of_row(y);
+    const auto width = static_cast<std::size_t>(job_.pixels.width);
+    const bool has_alpha = layout_.colour_type == PNG_COLOR_TYPE_RGB_ALPHA;
+    switch (job_.pixels.type) {
+        case PixelType::kU8:
+            std::memcpy(to, from, width);
+            break;
+        case PixelType::kI16:
+            swap_bytes_16(from, to, width);
+            break;
+        case PixelType::kRgbU64:
+            (has_alpha ? swap_red_blue_16 : bgra16_to_rgb16)(from, to, width);
+            break;
+        default:
+            if (job_.pixels.packing == Packing::kPacked24) {
+                bgr_to_rgb(from, to, width);
+            } else {
+                (has_alpha ? swap_red_blue : bgra_to_rgb)(from, to, width);
+            }
+            break;
+    }
+}
+
 void PngWriter::write_rows() {
+    if (pixels_) {
+        for (std::int32_t y = 0; y < job_.pixels.height; ++y) {
+            put_row(y, pixels_->row());
+            pixels_->put_row();
+        }
+        return pixels_->finish();
+    }
     session_.run(kUnableToWriteData, [this] {
         for (std::int32_t y = 0; y < job_.pixels.height; ++y) {
             png_write_row(session_.png(), samples_of_row(y));
@@ -195,8 +237,16 @@ void PngWriter::write_rows() {
     });
 }
 
+// Nothing but the end itself stands behind the pixels; and libpng would miss those that it did not
+// write.
 void PngWriter::write_end() {
-    session_.run(kUnableToWriteData, [this] { png_write_end(session_.png(), session_.info()); });
+    session_.run(kUnableToWriteData, [this] {
+        if (pixels_) {
+            png_write_chunk(session_.png(), reinterpret_cast<png_const_bytep>("IEND"), nullptr, 0);
+        } else {
+            png_write_end(session_.png(), session_.info());
+        }
+    });
 }
 
 }  // namespace zq
