@@ -184,8 +184,7 @@ RowDeflater::Match RowDeflater::find(std::size_t at) {
     const std::uint8_t* here = &window_[at];
     const std::size_t most = std::min(kLongestMatch, filled_ - at);
     std::size_t longest = kHashed - 1;
-    if (at > 0 && here[0] == here[-1] && here[1] == here[0] && here[2] == here[0] &&
-        here[3] == here[0]) {
+    if (at > 0 && std::memcmp(here, here - 1, kShortestRun) == 0) {
         const std::size_t length = common_length(here, here - 1, most);
         weigh(at, length, 1, best);
         longest = std::max(longest, length);
