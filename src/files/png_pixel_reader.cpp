@@ -65,19 +65,23 @@ bool PngPixelReader::fetch() {
     return true;
 }
 
+// Returns the bytes that came, at times none; there must be more of the stream.
+std::size_t PngPixelReader::inflate(std::span<std::uint8_t> room) {
+    if (stream_.is_finished()) throw kUnableToReadData;
+    const bool had_none = in_.empty();
+    const std::size_t before = room.size();
+    if (!stream_.inflate(in_, room)) throw kUnableToReadData;
+    const std::size_t made = before - room.size();
+    const bool wants_more = had_none && made == 0 && !stream_.is_finished();
+    if (wants_more && !fetch()) throw kUnableToReadData;
+    return made;
+}
+
 void PngPixelReader::fill(std::size_t wanted) {
     std::memmove(rows_.data(), rows_.data() + begin_, end_ - begin_);
     end_ -= begin_;
     begin_ = 0;
-    while (end_ < wanted) {
-        if (stream_.is_finished()) throw kUnableToReadData;
-        std::span<std::uint8_t> room = std::span(rows_).subspan(end_);
-        const std::size_t before = room.size();
-        if (!stream_.inflate(in_, room)) throw kUnableToReadData;
-        end_ += before - room.size();
-        const bool is_stuck = room.size() == before && in_.empty() && !stream_.is_finished();
-        if (is_stuck && !fetch()) throw kUnableToReadData;
-    }
+    while (end_ < wanted) end_ += inflate(std::span(rows_).subspan(end_));
 }
 
 void PngPixelReader::read_row(const std::uint8_t* above, std::uint8_t* to) {
@@ -89,13 +93,7 @@ void PngPixelReader::read_row(const std::uint8_t* above, std::uint8_t* to) {
 }
 
 PngPixelReader::Head PngPixelReader::finish() {
-    while (!stream_.is_finished()) {
-        std::span<std::uint8_t> room(rows_);
-        const std::size_t before = room.size();
-        if (!stream_.inflate(in_, room)) throw kUnableToReadData;
-        const bool is_stuck = room.size() == before && in_.empty() && !stream_.is_finished();
-        if (is_stuck && !fetch()) throw kUnableToReadData;
-    }
+    while (!stream_.is_finished()) inflate(rows_);
     while (fetch()) {
     }
     return head_;

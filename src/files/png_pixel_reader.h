@@ -31,6 +31,7 @@ class PngPixelReader {
     void open_chunk();
     void close_chunk();
     bool fetch();
+    std::size_t inflate(std::span<std::uint8_t> room);
     void fill(std::size_t wanted);
 
     InputFile& file_;

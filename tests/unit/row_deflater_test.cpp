@@ -119,7 +119,7 @@ Inflated inflate_in_parts(const Bytes& packed, std::size_t in_part, std::size_t 
         result.is_sound = stream.inflate(in, room);
         const std::size_t made = out_part - room.size();
         result.bytes.insert(result.bytes.end(), part.data(), part.data() + made);
-        if (is_last && made == 0) break;
+        if (is_last && made == 0) break;  // all is taken, and nothing comes
     }
     result.is_finished = stream.is_finished();
     return result;
