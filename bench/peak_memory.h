@@ -4,6 +4,9 @@
 #include <cstddef>
 #include <cstdio>
 #include <functional>
+#ifdef __GLIBC__
+#include <malloc.h>
+#endif
 
 namespace zqbench {
 
@@ -22,6 +25,9 @@ inline std::size_t status_bytes(const char* format) {
 
 // By how much the pages in use grow at most; 0 where that cannot be known.
 inline std::size_t peak_growth(const std::function<void()>& job) {
+#ifdef __GLIBC__
+    malloc_trim(0);  // what earlier jobs left would hide what this one takes
+#endif
     std::FILE* file = std::fopen("/proc/self/clear_refs", "w");
     if (file == nullptr) return 0;
     std::fputs("5", file);  // forgets the peak

@@ -19,11 +19,6 @@ struct PngCompression {
 
 class PngPixelWriter {
   public:
-    // Whether filtered rows or plain ones are to be written that this does better than libpng.
-    static bool suits(const PngCompression& compression) {
-        return compression.level == 0 || compression.filters != PNG_FILTER_NONE;
-    }
-
     // The session has written all that stands in front of the pixels, and must outlive this. `step`
     // is the bytes of a pixel. Throws std::bad_alloc.
     PngPixelWriter(PngSession& session, const PngCompression& compression, std::size_t row_bytes,

@@ -1,5 +1,5 @@
-// Writing PNG: libpng's chunks, and rows in the layout of the file. Unfiltered rows are libpng's to
-// compress.
+// Writing PNG: libpng's chunks, and rows in the layout of the file. Rows that are no photograph's,
+// or are not filtered, are libpng's to compress; stored ones are not.
 #include "files/png_writer.h"
 
 #include <algorithm>
@@ -180,11 +180,36 @@ void PngWriter::write_info() {
         write_chunks();
         set_transformations();
     });
-    if (!PngPixelWriter::suits(compression())) return;
+    const PngCompression chosen = compression();
+    if (chosen.filters == PNG_FILTER_NONE && chosen.level > 0) return;
     const std::size_t step = png_get_channels(session_.png(), session_.info()) *
                              static_cast<std::size_t>(layout_.depth / 8);
-    pixels_.emplace(session_, compression(), static_cast<std::size_t>(job_.pixels.width) * step,
-                    step);
+    const std::size_t row_bytes = static_cast<std::size_t>(job_.pixels.width) * step;
+    if (chosen.level > 0 && !is_photograph(row_bytes, step)) return;
+    pixels_.emplace(session_, chosen, row_bytes, step);
+}
+
+// By some rows from all over the picture. Drawings and tiny pictures are libpng's: they live from
+// matches of all lengths.
+bool PngWriter::is_photograph(std::size_t row_bytes, std::size_t step) {
+    constexpr std::size_t kTiny = 65536, kDrawnPercent = 70;
+    constexpr std::int32_t kSamples = 32;
+    const std::int32_t height = job_.pixels.height;
+    if (row_bytes < kTiny / static_cast<std::size_t>(height)) return false;
+    std::vector<std::uint8_t> above(kPngMostStep + row_bytes), row = above, filtered(row_bytes);
+    std::size_t sampled = 0, zeros = 0;
+    for (std::int32_t i = 0; i < kSamples; ++i) {
+        const auto y = static_cast<std::int32_t>(std::int64_t{height} * i / kSamples);
+        if (y == 0) continue;
+        put_row(y - 1, &above[kPngMostStep]);
+        put_row(y, &row[kPngMostStep]);
+        png_filter(PNG_FILTER_VALUE_PAETH, &row[kPngMostStep], &above[kPngMostStep], step,
+                   filtered.data(), row_bytes);
+        zeros +=
+            static_cast<std::size_t>(std::count(filtered.begin(), filtered.end(), std::uint8_t{0}));
+        sampled += row_bytes;
+    }
+    return zeros < sampled / 100 * kDrawnPercent;
 }
 
 const std::uint8_t* PngWriter::samples_of_row(std::int32_t y) {

@@ -39,6 +39,7 @@ class PngWriter {
     void set_transformations();
     const std::uint8_t* samples_of_row(std::int32_t y);
     void put_row(std::int32_t y, std::uint8_t* to);
+    bool is_photograph(std::size_t row_bytes, std::size_t step);
 
     OutputFile& file_;
     const WriteJob& job_;

@@ -60,12 +60,14 @@ TEST_F(PngStreamTest, LibpngReadsEveryTypeWidthAndSetting) {
     for (const Case c :
          {Case{ZQ_TYPE_U8, false}, Case{ZQ_TYPE_I16, false}, Case{ZQ_TYPE_RGB, false},
           Case{ZQ_TYPE_RGB, true}, Case{ZQ_TYPE_RGBU64, false}, Case{ZQ_TYPE_RGBU64, true}}) {
-        for (int32_t width = 1; width <= 67; ++width) {
+        for (int32_t width = 1; width <= 67; width += width < 18 ? 1 : 7) {
             const int32_t setting = (width * 3 + c.type) % 101;
             SCOPED_TRACE(testing::Message() << c.type << ' ' << width << ' ' << setting);
-            Picture picture(c.type, width, 9), target(ZQ_TYPE_SGL);
+            // Tall enough to be no tiny picture, which libpng would write.
+            const int32_t height = 66000 / width;
+            Picture picture(c.type, width, height), target(ZQ_TYPE_SGL);
             std::string pixels = picture.pixels();
-            const size_t bytes = pixels.size() / static_cast<size_t>(width * 9);
+            const size_t bytes = pixels.size() / static_cast<size_t>(width * height);
             for (size_t i = 0; i < pixels.size(); ++i) {
                 const bool is_fourth = bytes >= 4 && i % bytes / (bytes / 4) == 3;
                 const bool is_sign = c.type == ZQ_TYPE_I16 && i % 2 == 1;
