@@ -48,7 +48,6 @@ class RowDeflater {
     void put_block(std::size_t tokens, std::size_t bytes, const DeflateCounts& counts,
                    bool is_last);
     void slide();
-    void put_stored(bool is_last);
 
     Effort effort_;
     bool is_stored_;
