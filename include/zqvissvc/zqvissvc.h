@@ -11,6 +11,7 @@
 #include "host.h"
 #include "image.h"
 #include "slots.h"
+#include "timers.h"
 #include "types.h"
 #include "values.h"
 
