@@ -5,6 +5,7 @@
 #include "bayer.h"
 #include "convert.h"
 #include "custom_data.h"
+#include "display.h"
 #include "errors.h"
 #include "files.h"
 #include "flatten.h"

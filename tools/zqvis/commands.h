@@ -16,6 +16,7 @@ void add_convert(CLI::App& tool, Session& session);
 void add_data(CLI::App& tool, Session& session);
 void add_dump(CLI::App& tool, Session& session);
 void add_bayer(CLI::App& tool, Session& session);
+void add_draw(CLI::App& tool, Session& session);
 void add_raw(CLI::App& tool, Session& session);
 void add_flatten(CLI::App& tool, Session& session);
 void add_unflatten(CLI::App& tool, Session& session);

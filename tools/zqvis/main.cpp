@@ -23,6 +23,7 @@ int run(int argc, char** argv) {
     add_data(tool, session);
     add_bayer(tool, session);
     add_raw(tool, session);
+    add_draw(tool, session);
     add_flatten(tool, session);
     add_unflatten(tool, session);
     add_error(tool, session);

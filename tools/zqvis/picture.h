@@ -3,6 +3,7 @@
 #ifndef ZQVIS_PICTURE_H
 #define ZQVIS_PICTURE_H
 
+#include <zqvissvc/display.h>
 #include <zqvissvc/files.h>
 #include <zqvissvc/types.h>
 
@@ -66,6 +67,9 @@ class Picture {
 
     // Row y of the image proper, as stored, without padding. Valid while the picture lives.
     std::span<uint8_t> row(int32_t y) const;
+
+    // Draws the picture on a canvas, in the zoomed and scrolled place of a window.
+    void draw(ZqDeviceContext canvas, int32_t zoom, int32_t x_offset, int32_t y_offset) const;
 
     // The custom data, by its keys.
     std::vector<std::string> keys() const;

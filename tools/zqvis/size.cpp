@@ -18,14 +18,19 @@ std::optional<Size> parse_size(std::string_view text) {
     return size;
 }
 
+std::string complaint(const std::string& value) {
+    return parse_size(value) ? std::string() : value + " is no size";
+}
+
 }  // namespace
 
 void add_size_option(CLI::App& command, std::string& text) {
-    command.add_option("--size", text, "WIDTHxHEIGHT in pixels")
-        ->required()
-        ->check([](const std::string& value) {
-            return parse_size(value) ? std::string() : value + " is no size";
-        });
+    command.add_option("--size", text, "WIDTHxHEIGHT in pixels")->required()->check(complaint);
+}
+
+void add_size_option(CLI::App& command, const std::string& name, std::string& text,
+                     const std::string& help) {
+    command.add_option(name, text, help)->check(complaint);
 }
 
 Size to_size(const std::string& text) {

@@ -13,6 +13,9 @@ struct Size {
 
 // Declares a required --size WIDTHxHEIGHT that is checked and kept as text.
 void add_size_option(CLI::App& command, std::string& text);
+// The same under another name, not required.
+void add_size_option(CLI::App& command, const std::string& name, std::string& text,
+                     const std::string& help);
 // Of a text that the option took.
 Size to_size(const std::string& text);
 

@@ -1,0 +1,105 @@
+// Painting into a canvas: stretched bitmaps and brushes.
+#include <algorithm>
+#include <cstring>
+
+#include "display/canvas.h"
+
+namespace zq {
+namespace {
+
+std::uint32_t pixel_of_colour(std::uint32_t bgr) {
+    return (bgr & 0xFFU) << 16U | (bgr & 0xFF00U) | (bgr >> 16U & 0xFFU);
+}
+
+std::uint32_t read_pixel(const std::uint8_t* row, std::int32_t bits, std::int32_t x) {
+    const std::uint8_t* at = row + std::ptrdiff_t{x} * (bits / 8);
+    if (bits == 8) return *at * 0x010101U;
+    return at[0] | static_cast<std::uint32_t>(at[1]) << 8U |
+           static_cast<std::uint32_t>(at[2]) << 16U;
+}
+
+// The source column of each target column, so that rows need no division.
+std::vector<std::int32_t> source_columns(const Box& target, const Box& part, const Box& source) {
+    std::vector<std::int32_t> columns(static_cast<std::size_t>(part.width()));
+    for (std::size_t i = 0; i < columns.size(); ++i) {
+        const std::int64_t offset = part.left + static_cast<std::int64_t>(i) - target.left;
+        columns[i] =
+            static_cast<std::int32_t>(source.left + offset * source.width() / target.width());
+    }
+    return columns;
+}
+
+void paint_row(const Dib& dib, const std::uint8_t* from, const std::vector<std::int32_t>& columns,
+               std::uint32_t* to) {
+    const std::int32_t bits = dib.bits_per_pixel;
+    const auto paint = [&](auto depth) {
+        for (std::size_t i = 0; i < columns.size(); ++i)
+            to[i] = read_pixel(from, depth(), columns[i]);
+    };
+    if (bits == 8) return paint([] { return 8; });
+    if (bits == 24) return paint([] { return 24; });
+    paint([] { return 32; });
+}
+
+// Lines in the lower half of each byte, as the system's brushes: bits that are set are gaps.
+constexpr std::array<Pattern, 6> kHatches = {{
+    {0xFF, 0xFF, 0xFF, 0xFF, 0x00, 0xFF, 0xFF, 0xFF},  // horizontal
+    {0xF7, 0xF7, 0xF7, 0xF7, 0xF7, 0xF7, 0xF7, 0xF7},  // vertical
+    {0x7F, 0xBF, 0xDF, 0xEF, 0xF7, 0xFB, 0xFD, 0xFE},  // falling
+    {0xFE, 0xFD, 0xFB, 0xF7, 0xEF, 0xDF, 0xBF, 0x7F},  // rising
+    {0xF7, 0xF7, 0xF7, 0xF7, 0x00, 0xF7, 0xF7, 0xF7},  // cross
+    {0x7E, 0xBD, 0xDB, 0xE7, 0xE7, 0xDB, 0xBD, 0x7E},  // diagonal cross
+}};
+
+}  // namespace
+
+void Canvas::stretch(const Dib& dib, const Box& source, const Box& destination) {
+    const Box target = to_device(destination);
+    if (target.empty() || source.empty()) return;
+    for (const Box& clip : clip_) {
+        const Box part = intersect(target, clip);
+        if (part.empty()) continue;
+        const std::vector<std::int32_t> columns = source_columns(target, part, source);
+        std::int64_t painted = -1;
+        for (std::int32_t y = part.top; y < part.bottom; ++y) {
+            const std::int64_t line =
+                (std::int64_t{y} - target.top) * source.height() / target.height();
+            if (line == painted) {
+                // An enlarged row shows again.
+                std::memcpy(row(y) + part.left, row(y - 1) + part.left, columns.size() * 4);
+                continue;
+            }
+            painted = line;
+            const std::int64_t from = dib.bottom_up ? source.bottom - 1 - line : source.top + line;
+            paint_row(dib, dib.bits + static_cast<std::size_t>(from) * dib.stride(), columns,
+                      row(y) + part.left);
+        }
+    }
+}
+
+std::int32_t Canvas::fill(const Box& device, const Brush& brush) {
+    std::uint32_t set = pixel_of_colour(brush.background_colour);
+    std::uint32_t unset = pixel_of_colour(brush.text_colour);
+    Pattern pattern = brush.pattern;
+    if (brush.kind != Brush::Kind::kPattern) unset = pixel_of_colour(brush.colour);
+    if (brush.kind == Brush::Kind::kPlain) pattern = {};
+    if (brush.kind == Brush::Kind::kHatch) {
+        if (brush.hatch < 0 || brush.hatch > 5) return 0;
+        pattern = kHatches[static_cast<std::size_t>(brush.hatch)];
+    }
+    for (const Box& clip : clip_) {
+        const Box part = intersect(device, clip);
+        for (std::int32_t y = part.top; y < part.bottom; ++y) {
+            const std::uint8_t bits =
+                pattern[static_cast<std::size_t>((y - std::int64_t{device.top}) % 8)];
+            std::uint32_t* to = row(y);
+            for (std::int32_t x = part.left; x < part.right; ++x) {
+                const auto column = static_cast<unsigned>((x - std::int64_t{device.left}) % 8);
+                to[x] = (bits << column & 0x80U) != 0 ? set : unset;
+            }
+        }
+    }
+    return 1;
+}
+
+}  // namespace zq
