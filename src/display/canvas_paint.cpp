@@ -3,19 +3,13 @@
 #include <cstring>
 
 #include "display/canvas.h"
+#include "display/row_painter.h"
 
 namespace zq {
 namespace {
 
 std::uint32_t pixel_of_colour(std::uint32_t bgr) {
     return (bgr & 0xFFU) << 16U | (bgr & 0xFF00U) | (bgr >> 16U & 0xFFU);
-}
-
-std::uint32_t read_pixel(const std::uint8_t* row, std::int32_t bits, std::int32_t x) {
-    const std::uint8_t* at = row + std::ptrdiff_t{x} * (bits / 8);
-    if (bits == 8) return *at * 0x010101U;
-    return at[0] | static_cast<std::uint32_t>(at[1]) << 8U |
-           static_cast<std::uint32_t>(at[2]) << 16U;
 }
 
 // The source column of each target column, so that rows need no division.
@@ -27,18 +21,6 @@ std::vector<std::int32_t> source_columns(const Box& target, const Box& part, con
             static_cast<std::int32_t>(source.left + offset * source.width() / target.width());
     }
     return columns;
-}
-
-void paint_row(const Dib& dib, const std::uint8_t* from, const std::vector<std::int32_t>& columns,
-               std::uint32_t* to) {
-    const std::int32_t bits = dib.bits_per_pixel;
-    const auto paint = [&](auto depth) {
-        for (std::size_t i = 0; i < columns.size(); ++i)
-            to[i] = read_pixel(from, depth(), columns[i]);
-    };
-    if (bits == 8) return paint([] { return 8; });
-    if (bits == 24) return paint([] { return 24; });
-    paint([] { return 32; });
 }
 
 // Lines in the lower half of each byte, as the system's brushes: bits that are set are gaps.
@@ -59,20 +41,21 @@ void Canvas::stretch(const Dib& dib, const Box& source, const Box& destination) 
     for (const Box& clip : clip_) {
         const Box part = intersect(target, clip);
         if (part.empty()) continue;
-        const std::vector<std::int32_t> columns = source_columns(target, part, source);
+        RowPainter painter(dib.bits_per_pixel, source_columns(target, part, source));
         std::int64_t painted = -1;
         for (std::int32_t y = part.top; y < part.bottom; ++y) {
             const std::int64_t line =
                 (std::int64_t{y} - target.top) * source.height() / target.height();
+            std::uint32_t* to = row(y) + part.left;
             if (line == painted) {
                 // An enlarged row shows again.
-                std::memcpy(row(y) + part.left, row(y - 1) + part.left, columns.size() * 4);
+                std::memcpy(to, row(y - 1) + part.left,
+                            static_cast<std::size_t>(part.width()) * sizeof(*to));
                 continue;
             }
             painted = line;
             const std::int64_t from = dib.bottom_up ? source.bottom - 1 - line : source.top + line;
-            paint_row(dib, dib.bits + static_cast<std::size_t>(from) * dib.stride(), columns,
-                      row(y) + part.left);
+            painter.paint(dib.bits + static_cast<std::size_t>(from) * dib.stride(), to);
         }
     }
 }

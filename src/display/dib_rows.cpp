@@ -25,10 +25,9 @@ bool fits_in_place(const PixelView& view) {
 }
 
 template <class Row>
-void fill_rows(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>& scratch,
-               const Row& row) {
+void fill_rows(const PixelView& view, const Dib& dib, const DibScratch& scratch, const Row& row) {
     for (std::int32_t y = 0; y < view.height; ++y) {
-        row(view.row(y), scratch.data() + static_cast<std::size_t>(y) * dib.stride());
+        row(view.row(y), scratch.get() + static_cast<std::size_t>(y) * dib.stride());
     }
 }
 
@@ -42,7 +41,7 @@ Range range_of(const PixelView& view) {
     return range;
 }
 
-void show_samples(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>& scratch) {
+void show_samples(const PixelView& view, const Dib& dib, const DibScratch& scratch) {
     const auto width = static_cast<std::size_t>(view.width);
     const bool full_range = view.right_shift == 0 && view.bit_depth == 0;
     Reduction reduction(view.bit_depth);
@@ -61,7 +60,7 @@ void show_samples(const PixelView& view, const Dib& dib, std::vector<std::uint8_
 
 // Each row goes at once where the exchange of the quadrants takes it; an odd last row or column
 // stays.
-void show_spectrum(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>& scratch) {
+void show_spectrum(const PixelView& view, const Dib& dib, const DibScratch& scratch) {
     const double pixels = static_cast<double>(view.width) * view.height;
     const double scale = static_cast<float>(128.0 / pixels);
     const auto width = static_cast<std::size_t>(view.width);
@@ -70,7 +69,7 @@ void show_spectrum(const PixelView& view, const Dib& dib, std::vector<std::uint8
         const bool moves = y < 2 * half_height;
         const std::size_t half = moves ? width / 2 : 0;
         const auto target = [&](std::int32_t row) {
-            return scratch.data() + static_cast<std::size_t>(row) * dib.stride();
+            return scratch.get() + static_cast<std::size_t>(row) * dib.stride();
         };
         const auto* from = reinterpret_cast<const float*>(view.row(y));
         if (moves) {
@@ -82,7 +81,7 @@ void show_spectrum(const PixelView& view, const Dib& dib, std::vector<std::uint8
     }
 }
 
-void show(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>& scratch) {
+void show(const PixelView& view, const Dib& dib, const DibScratch& scratch) {
     const auto width = static_cast<std::size_t>(view.width);
     switch (view.type) {
         case PixelType::kI16:
@@ -126,7 +125,7 @@ PixelView PixelView::of(const Image& image) {
             .bit_depth = image.bit_depth()};
 }
 
-Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch) {
+Dib make_dib(const PixelView& view, DibScratch& scratch) {
     const bool colour = view.type >= PixelType::kRgb;
     Dib dib{.width = view.width,
             .height = view.height,
@@ -142,9 +141,10 @@ Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch) {
         (static_cast<std::uint64_t>(view.width) * static_cast<unsigned>(dib.bits_per_pixel) / 8 +
          3) &
         ~std::uint64_t{3};
-    scratch.resize(checked_narrow<std::size_t>(
+    // Not cleared, which would cost as much as some of the mappings.
+    scratch = std::make_unique_for_overwrite<std::uint8_t[]>(checked_narrow<std::size_t>(
         checked_mul(row_bytes, static_cast<std::uint64_t>(view.height))));
-    dib.bits = scratch.data();
+    dib.bits = scratch.get();
     show(view, dib, scratch);
     return dib;
 }

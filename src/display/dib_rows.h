@@ -2,7 +2,7 @@
 #pragma once
 
 #include <cstdint>
-#include <vector>
+#include <memory>
 
 #include "image/image.h"
 #include "platform/device_context.h"
@@ -30,8 +30,11 @@ struct PixelView {
     }
 };
 
+// What is between the end of a row and the next one is not set.
+using DibScratch = std::unique_ptr<std::uint8_t[]>;
+
 // The bitmap of a view that has pixels. `scratch` gets the rows that cannot be shown in place and
 // must live as long as the bitmap. Throws kNotEnoughMemory.
-Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch);
+Dib make_dib(const PixelView& view, DibScratch& scratch);
 
 }  // namespace zq

@@ -108,7 +108,7 @@ void draw(DeviceContext& dc, const PixelView& view, const Box& source_box,
         destination = source;
     }
     if (!lies_inside(source, view)) return;
-    std::vector<std::uint8_t> scratch;
+    DibScratch scratch;
     Dib dib = make_dib(view, scratch);
     dib.bottom_up = options.bottom_up;
     const bool equal_sizes =
