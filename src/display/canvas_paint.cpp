@@ -2,7 +2,10 @@
 #include <algorithm>
 #include <cstring>
 
+#include "base/byte_order.h"
 #include "display/canvas.h"
+#include "kernels/colour_rows.h"
+#include "kernels/from_u8.h"
 
 namespace zq {
 namespace {
@@ -11,43 +14,79 @@ std::uint32_t pixel_of_colour(std::uint32_t bgr) {
     return (bgr & 0xFFU) << 16U | (bgr & 0xFF00U) | (bgr >> 16U & 0xFFU);
 }
 
-std::uint32_t read_pixel(const std::uint8_t* row, std::int32_t bits, std::int32_t x) {
-    const std::uint8_t* at = row + std::ptrdiff_t{x} * (bits / 8);
-    if (bits == 8) return *at * 0x010101U;
-    return at[0] | static_cast<std::uint32_t>(at[1]) << 8U |
-           static_cast<std::uint32_t>(at[2]) << 16U;
+// Which of `size` source positions the target position i of `shown` takes, as the system's
+// colour-on-colour stretching does: enlarging repeats each; shrinking takes the first of each
+// group.
+std::int64_t first_of_group(std::int64_t i, std::int64_t size, std::int64_t shown) {
+    if (shown > size) return ((2 * i + 1) * size - 1) / (2 * shown);
+    return (2 * i * size + shown) / (2 * shown);
 }
 
-// The source column of each target column, so that rows need no division.
-std::vector<std::int32_t> source_columns(const Box& target, const Box& part, const Box& source) {
-    std::vector<std::int32_t> columns(static_cast<std::size_t>(part.width()));
-    for (std::size_t i = 0; i < columns.size(); ++i) {
-        const std::int64_t offset = part.left + static_cast<std::int64_t>(i) - target.left;
-        columns[i] =
-            static_cast<std::int32_t>(source.left + offset * source.width() / target.width());
+// The last of each group: the same but for shrinking.
+std::int64_t last_of_group(std::int64_t i, std::int64_t size, std::int64_t shown) {
+    if (shown > size) return first_of_group(i, size, shown);
+    return first_of_group(i + 1, size, shown) - 1;
+}
+
+// Pixels of source rows as those of the canvas. One object paints all rows of a part.
+class RowPainter {
+  public:
+    RowPainter(const Dib& dib, const Box& source, const Box& target, const Box& part)
+        : bits_(static_cast<std::size_t>(dib.bits_per_pixel)),
+          columns_(static_cast<std::size_t>(part.width())) {
+        for (std::size_t i = 0; i < columns_.size(); ++i) {
+            const std::int64_t at = part.left + static_cast<std::int64_t>(i) - target.left;
+            columns_[i] = static_cast<std::size_t>(
+                source.left + last_of_group(at, source.width(), target.width()));
+        }
+        const std::size_t span = columns_.back() - columns_.front() + 1;
+        consecutive_ = source.width() == target.width();
+        if (span < columns_.size()) line_.resize(span);
     }
-    return columns;
-}
 
-void paint_row(const Dib& dib, const std::uint8_t* from, const std::vector<std::int32_t>& columns,
-               std::uint32_t* to) {
-    const std::int32_t bits = dib.bits_per_pixel;
-    const auto paint = [&](auto depth) {
-        for (std::size_t i = 0; i < columns.size(); ++i)
-            to[i] = read_pixel(from, depth(), columns[i]);
-    };
-    if (bits == 8) return paint([] { return 8; });
-    if (bits == 24) return paint([] { return 24; });
-    paint([] { return 32; });
-}
+    void paint(const std::uint8_t* row, std::uint32_t* to) {
+        const std::size_t first = columns_.front();
+        if (consecutive_) return expand(row, to, columns_.size());
+        if (line_.empty()) return pick(row, to);
+        expand(row, line_.data(), line_.size());
+        for (std::size_t i = 0; i < columns_.size(); ++i) to[i] = line_[columns_[i] - first];
+    }
+
+  private:
+    // From the first column on.
+    void expand(const std::uint8_t* row, std::uint32_t* to, std::size_t pixels) const {
+        const std::uint8_t* from = row + columns_.front() * (bits_ / 8);
+        if (bits_ == 8) return u8_to_grey32(from, to, pixels, Stores::kCached);
+        if (bits_ == 24) return bgr_to_bgra(from, reinterpret_cast<std::uint8_t*>(to), pixels);
+        for (std::size_t i = 0; i < pixels; ++i) to[i] = load_le32(from + 4 * i) & 0xFFFFFFU;
+    }
+    void pick(const std::uint8_t* row, std::uint32_t* to) const {
+        const auto each = [&](auto pixel) {
+            for (std::size_t i = 0; i < columns_.size(); ++i) to[i] = pixel(columns_[i]);
+        };
+        if (bits_ == 8) return each([&](std::size_t x) { return row[x] * 0x010101U; });
+        if (bits_ == 32) {
+            return each([&](std::size_t x) { return load_le32(row + 4 * x) & 0xFFFFFFU; });
+        }
+        each([&](std::size_t x) {
+            const std::uint8_t* at = row + 3 * x;
+            return std::uint32_t{load_le16(at)} | std::uint32_t{at[2]} << 16U;
+        });
+    }
+
+    std::size_t bits_;
+    std::vector<std::size_t> columns_;
+    bool consecutive_;
+    std::vector<std::uint32_t> line_;  // of an enlarged row
+};
 
 // Lines in the lower half of each byte, as the system's brushes: bits that are set are gaps.
 constexpr std::array<Pattern, 6> kHatches = {{
-    {0xFF, 0xFF, 0xFF, 0xFF, 0x00, 0xFF, 0xFF, 0xFF},  // horizontal
+    {0xFF, 0xFF, 0xFF, 0x00, 0xFF, 0xFF, 0xFF, 0xFF},  // horizontal
     {0xF7, 0xF7, 0xF7, 0xF7, 0xF7, 0xF7, 0xF7, 0xF7},  // vertical
     {0x7F, 0xBF, 0xDF, 0xEF, 0xF7, 0xFB, 0xFD, 0xFE},  // falling
     {0xFE, 0xFD, 0xFB, 0xF7, 0xEF, 0xDF, 0xBF, 0x7F},  // rising
-    {0xF7, 0xF7, 0xF7, 0xF7, 0x00, 0xF7, 0xF7, 0xF7},  // cross
+    {0xF7, 0xF7, 0xF7, 0x00, 0xF7, 0xF7, 0xF7, 0xF7},  // cross
     {0x7E, 0xBD, 0xDB, 0xE7, 0xE7, 0xDB, 0xBD, 0x7E},  // diagonal cross
 }};
 
@@ -59,20 +98,21 @@ void Canvas::stretch(const Dib& dib, const Box& source, const Box& destination) 
     for (const Box& clip : clip_) {
         const Box part = intersect(target, clip);
         if (part.empty()) continue;
-        const std::vector<std::int32_t> columns = source_columns(target, part, source);
+        RowPainter painter(dib, source, target, part);
         std::int64_t painted = -1;
         for (std::int32_t y = part.top; y < part.bottom; ++y) {
             const std::int64_t line =
-                (std::int64_t{y} - target.top) * source.height() / target.height();
+                first_of_group(std::int64_t{y} - target.top, source.height(), target.height());
+            std::uint32_t* to = row(y) + part.left;
             if (line == painted) {
                 // An enlarged row shows again.
-                std::memcpy(row(y) + part.left, row(y - 1) + part.left, columns.size() * 4);
+                std::memcpy(to, row(y - 1) + part.left,
+                            static_cast<std::size_t>(part.width()) * sizeof(*to));
                 continue;
             }
             painted = line;
             const std::int64_t from = dib.bottom_up ? source.bottom - 1 - line : source.top + line;
-            paint_row(dib, dib.bits + static_cast<std::size_t>(from) * dib.stride(), columns,
-                      row(y) + part.left);
+            painter.paint(dib.bits + static_cast<std::size_t>(from) * dib.stride(), to);
         }
     }
 }

@@ -1,15 +1,14 @@
 // Images as bitmaps that a device context takes.
 #include "display/dib_rows.h"
 
-#include <algorithm>
 #include <cstring>
-#include <limits>
 
 #include "base/checked.h"
 #include "convert/convert_rows.h"
 #include "kernels/colour_model.h"
 #include "kernels/from_float.h"
 #include "kernels/from_i16.h"
+#include "kernels/grey_range.h"
 
 namespace zq {
 namespace {
@@ -33,45 +32,14 @@ void fill_rows(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>&
     }
 }
 
-template <class Sample>
-struct Range {
-    Sample least, largest;
-};
-
-Range<std::int16_t> range_of_samples(const PixelView& view) {
-    Range<std::int16_t> range{std::numeric_limits<std::int16_t>::max(),
-                              std::numeric_limits<std::int16_t>::min()};
+template <class Sample, class Range>
+Range range_of(const PixelView& view) {
+    Range range;
     for (std::int32_t y = 0; y < view.height; ++y) {
-        const auto* from = reinterpret_cast<const std::int16_t*>(view.row(y));
-        for (std::int32_t x = 0; x < view.width; ++x) {
-            range.least = std::min(range.least, from[x]);
-            range.largest = std::max(range.largest, from[x]);
-        }
+        widen_range(reinterpret_cast<const Sample*>(view.row(y)),
+                    static_cast<std::size_t>(view.width), range);
     }
     return range;
-}
-
-// NaN takes no part. The largest value starts at the smallest normal number, so that of an image of
-// negative values stays there.
-Range<float> range_of_floats(const PixelView& view) {
-    Range<float> range{std::numeric_limits<float>::max(), std::numeric_limits<float>::min()};
-    for (std::int32_t y = 0; y < view.height; ++y) {
-        const auto* from = reinterpret_cast<const float*>(view.row(y));
-        for (std::int32_t x = 0; x < view.width; ++x) {
-            range.least = from[x] < range.least ? from[x] : range.least;
-            range.largest = from[x] > range.largest ? from[x] : range.largest;
-        }
-    }
-    return range;
-}
-
-// The low byte of the quotient as a 32-bit number; 0 where it is none (an empty range, NaN, or too
-// large).
-std::uint8_t low_byte(float value, Range<float> range) {
-    constexpr float kLimit = 2147483648.0F;
-    const float quotient = (value - range.least) * 255.0F / (range.largest - range.least);
-    if (!(quotient >= -kLimit && quotient < kLimit)) return 0;
-    return static_cast<std::uint8_t>(static_cast<std::int32_t>(quotient));
 }
 
 void show_samples(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>& scratch) {
@@ -82,14 +50,12 @@ void show_samples(const PixelView& view, const Dib& dib, std::vector<std::uint8_
         reduction.shift = view.right_shift;
         reduction.half = 0;
     }
-    const Range<std::int16_t> range = full_range ? range_of_samples(view) : Range<std::int16_t>{};
-    const std::int32_t span = std::max(1, range.largest - range.least);
+    SampleRange range;
+    if (full_range) range = range_of<std::int16_t, SampleRange>(view);
     fill_rows(view, dib, scratch, [&](const std::uint8_t* from, std::uint8_t* to) {
         const auto* samples = reinterpret_cast<const std::int16_t*>(from);
-        if (!full_range) return i16_to_u8(samples, to, width, reduction);
-        for (std::size_t x = 0; x < width; ++x) {
-            to[x] = static_cast<std::uint8_t>((samples[x] - range.least) * 255 / span);
-        }
+        if (full_range) return i16_to_u8_in_range(samples, to, width, range);
+        i16_to_u8(samples, to, width, reduction);
     });
 }
 
@@ -122,10 +88,9 @@ void show(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>& scra
         case PixelType::kI16:
             return show_samples(view, dib, scratch);
         case PixelType::kSgl: {
-            const Range<float> range = range_of_floats(view);
+            const auto range = range_of<float, FloatRange>(view);
             return fill_rows(view, dib, scratch, [&](const std::uint8_t* from, std::uint8_t* to) {
-                const auto* values = reinterpret_cast<const float*>(from);
-                for (std::size_t x = 0; x < width; ++x) to[x] = low_byte(values[x], range);
+                f32_to_u8_in_range(reinterpret_cast<const float*>(from), to, width, range);
             });
         }
         case PixelType::kComplex:

@@ -1,0 +1,36 @@
+// Rows of samples to 8 bits by their range: the least becomes black, the largest white. Any
+// alignment, any number of pixels; nothing beyond a row is touched; source and destination do not
+// overlap.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <limits>
+
+namespace zq {
+
+struct SampleRange {
+    std::int32_t least = std::numeric_limits<std::int16_t>::max();
+    std::int32_t largest = std::numeric_limits<std::int16_t>::min();
+};
+
+// The largest value starts at the smallest normal number, so that of negative values stays there.
+struct FloatRange {
+    float least = std::numeric_limits<float>::max();
+    float largest = std::numeric_limits<float>::min();
+};
+
+// Widens a range by a row. NaN takes no part.
+void widen_range(const std::int16_t* from, std::size_t pixels, SampleRange& range);
+void widen_range(const float* from, std::size_t pixels, FloatRange& range);
+
+// (sample - least) * 255 / (largest - least) of samples within the range, rounded down; 0 for a
+// range of one value.
+void i16_to_u8_in_range(const std::int16_t* from, std::uint8_t* to, std::size_t pixels,
+                        SampleRange range);
+
+// (value - least) * 255 / (largest - least) in single precision, cut towards zero, and of that the
+// low byte; 0 where the quotient is no 32-bit number (a range of one value, NaN, overflow).
+void f32_to_u8_in_range(const float* from, std::uint8_t* to, std::size_t pixels, FloatRange range);
+
+}  // namespace zq

@@ -1,0 +1,29 @@
+// The obvious loops: what the fast ones must equal.
+#pragma once
+
+#include "kernels/grey_range.h"
+
+namespace zq::scalar {
+
+template <class Sample, class Range>
+void widen_range(const Sample* from, std::size_t pixels, Range& range) {
+    for (std::size_t i = 0; i < pixels; ++i) {
+        if (from[i] < range.least) range.least = from[i];
+        if (from[i] > range.largest) range.largest = from[i];
+    }
+}
+
+inline std::uint8_t in_range(std::int16_t sample, SampleRange range) {
+    const std::int32_t span = range.largest - range.least;
+    return span < 1 ? std::uint8_t{0}
+                    : static_cast<std::uint8_t>((sample - range.least) * 255 / span);
+}
+
+inline std::uint8_t in_range(float value, FloatRange range) {
+    constexpr float kLimit = 2147483648.0F;
+    const float quotient = (value - range.least) * 255.0F / (range.largest - range.least);
+    if (!(quotient >= -kLimit && quotient < kLimit)) return 0;
+    return static_cast<std::uint8_t>(static_cast<std::int32_t>(quotient));
+}
+
+}  // namespace zq::scalar
