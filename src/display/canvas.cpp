@@ -61,12 +61,6 @@ void subtract(const Box& box, const Box& hole, std::vector<Box>& rest) {
 
 }  // namespace
 
-Box intersect(const Box& a, const Box& b) {
-    const Box common{std::max(a.left, b.left), std::max(a.top, b.top), std::min(a.right, b.right),
-                     std::min(a.bottom, b.bottom)};
-    return common.empty() ? Box{0, 0, 0, 0} : common;
-}
-
 Canvas::Canvas(std::int32_t width, std::int32_t height)
     : width_(width), height_(height), pixels_(area(width, height)), clip_{bounds()} {}
 
@@ -102,13 +96,7 @@ Box Canvas::clip_box() {
                      : Box{std::min(around.left, box.left), std::min(around.top, box.top),
                            std::max(around.right, box.right), std::max(around.bottom, box.bottom)};
     }
-    // Every logical pixel that shows in part belongs to it.
-    const Box logical = to_logical(around);
-    const Box again = to_device(logical);
-    return {logical.left - (again.left > around.left ? 1 : 0),
-            logical.top - (again.top > around.top ? 1 : 0),
-            logical.right + (again.right < around.right ? 1 : 0),
-            logical.bottom + (again.bottom < around.bottom ? 1 : 0)};
+    return covering(*this, around);
 }
 
 Box Canvas::to_logical(const Box& device) {

@@ -12,24 +12,38 @@ std::uint32_t pixel_of_colour(std::uint32_t bgr) {
     return (bgr & 0xFFU) << 16U | (bgr & 0xFF00U) | (bgr >> 16U & 0xFFU);
 }
 
+// Which of `size` source positions the target position i of `shown` takes, as the system's
+// colour-on-colour stretching does: enlarging repeats each; shrinking takes the first of each
+// group.
+std::int64_t first_of_group(std::int64_t i, std::int64_t size, std::int64_t shown) {
+    if (shown > size) return ((2 * i + 1) * size - 1) / (2 * shown);
+    return (2 * i * size + shown) / (2 * shown);
+}
+
+// The last of each group: the same but for shrinking.
+std::int64_t last_of_group(std::int64_t i, std::int64_t size, std::int64_t shown) {
+    if (shown > size) return first_of_group(i, size, shown);
+    return first_of_group(i + 1, size, shown) - 1;
+}
+
 // The source column of each target column, so that rows need no division.
 std::vector<std::int32_t> source_columns(const Box& target, const Box& part, const Box& source) {
     std::vector<std::int32_t> columns(static_cast<std::size_t>(part.width()));
     for (std::size_t i = 0; i < columns.size(); ++i) {
-        const std::int64_t offset = part.left + static_cast<std::int64_t>(i) - target.left;
-        columns[i] =
-            static_cast<std::int32_t>(source.left + offset * source.width() / target.width());
+        const std::int64_t at = part.left + static_cast<std::int64_t>(i) - target.left;
+        columns[i] = static_cast<std::int32_t>(source.left +
+                                               last_of_group(at, source.width(), target.width()));
     }
     return columns;
 }
 
 // Lines in the lower half of each byte, as the system's brushes: bits that are set are gaps.
 constexpr std::array<Pattern, 6> kHatches = {{
-    {0xFF, 0xFF, 0xFF, 0xFF, 0x00, 0xFF, 0xFF, 0xFF},  // horizontal
+    {0xFF, 0xFF, 0xFF, 0x00, 0xFF, 0xFF, 0xFF, 0xFF},  // horizontal
     {0xF7, 0xF7, 0xF7, 0xF7, 0xF7, 0xF7, 0xF7, 0xF7},  // vertical
     {0x7F, 0xBF, 0xDF, 0xEF, 0xF7, 0xFB, 0xFD, 0xFE},  // falling
     {0xFE, 0xFD, 0xFB, 0xF7, 0xEF, 0xDF, 0xBF, 0x7F},  // rising
-    {0xF7, 0xF7, 0xF7, 0xF7, 0x00, 0xF7, 0xF7, 0xF7},  // cross
+    {0xF7, 0xF7, 0xF7, 0x00, 0xF7, 0xF7, 0xF7, 0xF7},  // cross
     {0x7E, 0xBD, 0xDB, 0xE7, 0xE7, 0xDB, 0xBD, 0x7E},  // diagonal cross
 }};
 
@@ -45,7 +59,7 @@ void Canvas::stretch(const Dib& dib, const Box& source, const Box& destination) 
         std::int64_t painted = -1;
         for (std::int32_t y = part.top; y < part.bottom; ++y) {
             const std::int64_t line =
-                (std::int64_t{y} - target.top) * source.height() / target.height();
+                first_of_group(std::int64_t{y} - target.top, source.height(), target.height());
             std::uint32_t* to = row(y) + part.left;
             if (line == painted) {
                 // An enlarged row shows again.

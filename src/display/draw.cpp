@@ -28,15 +28,15 @@ bool lies_inside(const Box& source, const PixelView& view) {
 
 // Every tile is a top-down bitmap of its own, as high as its band.
 void stretch_tiles(DeviceContext& dc, const Dib& dib, const Box& source, const Box& destination) {
-    for (std::int32_t y = source.top; y < source.bottom; y += kTile) {
-        const std::int32_t height = std::min(kTile, source.bottom - y);
+    for (std::int32_t y = source.top, height = 0; y < source.bottom; y += height) {
+        height = std::min(kTile, source.bottom - y);
         Dib band = dib;
         band.bits += static_cast<std::size_t>(y) * dib.stride();
         band.height = height;
         band.bottom_up = false;
         const std::int32_t to_y = destination.top + (y - source.top);
-        for (std::int32_t x = source.left; x < source.right; x += kTile) {
-            const std::int32_t width = std::min(kTile, source.right - x);
+        for (std::int32_t x = source.left, width = 0; x < source.right; x += width) {
+            width = std::min(kTile, source.right - x);
             const std::int32_t to_x = destination.left + (x - source.left);
             dc.stretch(band, {x, 0, x + width, height}, {to_x, to_y, to_x + width, to_y + height});
         }
@@ -106,6 +106,11 @@ void draw(DeviceContext& dc, const PixelView& view, const Box& source_box,
         source = intersect(source, inflate(dc.clip_box(), window.x > viewport.x ? 1 : 0,
                                            window.y > viewport.y ? 1 : 0));
         destination = source;
+        // Seen upside down, the visible rows are those at the other end of the box.
+        if (options.bottom_up) {
+            source.top = source_box.top + (source_box.bottom - destination.bottom);
+            source.bottom = source.top + (destination.bottom - destination.top);
+        }
     }
     if (!lies_inside(source, view)) return;
     DibScratch scratch;

@@ -89,4 +89,7 @@ class DeviceContext {
     virtual std::uint32_t button_face() = 0;  // 0x00BBGGRR
 };
 
+// The smallest box of logical units around one of device pixels.
+Box covering(DeviceContext& dc, const Box& device);
+
 }  // namespace zq

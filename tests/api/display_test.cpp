@@ -4,6 +4,7 @@
 #include <zqvissvc/errors.h>
 #include <zqvissvc/image.h>
 
+#include <algorithm>
 #include <climits>
 #include <vector>
 
@@ -99,6 +100,50 @@ TEST(Display, ZoomsOverThePattern) {
     EXPECT_EQ(place.bottom, 3);
     EXPECT_EQ(Gen_PlotZoomedImage(canvas.handle, nullptr, 2, 3, 2, 0, 0, 12, nullptr), 0U);
     EXPECT_EQ(canvas.row(2), (Row{255, 255, 240, 240, 255, 255, 240, 240}));
+}
+
+TEST(Display, ClippedDrawsShowWhatWholeOnesShowThere) {
+    std::vector<uint8_t> pixels(20 * 20);
+    for (size_t i = 0; i < pixels.size(); ++i) pixels[i] = static_cast<uint8_t>(1 + i % 200);
+    const ZqCoordinates clips[] = {{3, 5, 11, 9}, {0, 19, 20, 20}, {7, 0, 8, 20}};
+    for (const int32_t zoom : {1, 2, 7, 16, -2, -3}) {
+        for (const int32_t offset : {0, 1, 7, 9}) {
+            for (const uint32_t flags : {0U, 1U}) {
+                const auto draw = [&](const TestCanvas& canvas) {
+                    Gen_PlotZoomedImage(canvas.handle, pixels.data(), zoom, 20, 20, offset, offset,
+                                        flags, nullptr);
+                };
+                const TestCanvas whole(20, 20);
+                draw(whole);
+                for (const ZqCoordinates& clip : clips) {
+                    const TestCanvas part(20, 20);
+                    ZqSetCanvasClip(part.handle, &clip);
+                    draw(part);
+                    for (int32_t y = clip.top; y < clip.bottom; ++y) {
+                        const Row expected = whole.row(y), actual = part.row(y);
+                        const auto inside = [&](const Row& row) {
+                            Row some(row.begin() + clip.left, row.begin() + clip.right);
+                            // The pattern starts at the corner of what is painted.
+                            for (int& blue : some) blue = std::min(blue, 240);
+                            return some;
+                        };
+                        EXPECT_EQ(inside(actual), inside(expected))
+                            << zoom << ' ' << offset << ' ' << flags << ' ' << y;
+                    }
+                }
+            }
+        }
+    }
+}
+
+TEST(Display, ShrinksToTheFirstRowAndTheLastColumnOfEachGroup) {
+    TestCanvas canvas(2, 2);
+    const uint8_t pixels[] = {1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16};
+    EXPECT_EQ(Gen_PlotZoomedImage(canvas.handle, pixels, -2, 4, 4, 0, 0, 0, nullptr), 0U);
+    EXPECT_EQ(canvas.row(0), (Row{2, 4}));
+    EXPECT_EQ(canvas.row(1), (Row{10, 12}));
+    EXPECT_EQ(Gen_PlotZoomedImage(canvas.handle, pixels, -2, 4, 4, 0, 0, 1, nullptr), 0U);
+    EXPECT_EQ(canvas.row(0), (Row{14, 16})) << "the first row as it is seen";
 }
 
 TEST(Display, PaintsEveryBrushButTheExcludedRectangle) {

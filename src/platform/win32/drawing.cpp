@@ -67,9 +67,14 @@ class GdiContext final : public DeviceContext {
         SetViewportExtEx(dc_, m.viewport_extent.x, m.viewport_extent.y, nullptr);
     }
     Box clip_box() override {
+        // In device pixels first: what the system gives in logical units may miss pixels.
+        const Mapping kept = mapping();
+        const Mapping text;
+        set_mapping(text);
         RECT box{};
-        if (GetClipBox(dc_, &box) == ERROR) return {0, 0, 0, 0};
-        return box_of(box);
+        const bool known = GetClipBox(dc_, &box) != ERROR;
+        set_mapping(kept);
+        return known ? covering(*this, box_of(box)) : Box{0, 0, 0, 0};
     }
     Box to_logical(const Box& device) override {
         RECT box = rect_of(device);
@@ -88,10 +93,15 @@ class GdiContext final : public DeviceContext {
         SetBrushOrgEx(dc_, 0, 0, nullptr);
     }
     void stretch(const Dib& dib, const Box& source, const Box& destination) override {
-        const GreyDib header = header_of(dib);
+        // The source is told as a bitmap of its own: from which end the system counts rows inside
+        // of one depends on too much.
+        Dib rows = dib;
+        rows.bits += static_cast<std::size_t>(source.top) * dib.stride();
+        rows.height = static_cast<std::int32_t>(source.height());
+        const GreyDib header = header_of(rows);
         StretchDIBits(dc_, destination.left, destination.top, static_cast<int>(destination.width()),
-                      static_cast<int>(destination.height()), source.left, source.top,
-                      static_cast<int>(source.width()), static_cast<int>(source.height()), dib.bits,
+                      static_cast<int>(destination.height()), source.left, 0,
+                      static_cast<int>(source.width()), rows.height, rows.bits,
                       reinterpret_cast<const BITMAPINFO*>(&header), DIB_RGB_COLORS, SRCCOPY);
     }
     std::int32_t fill(const Box& device, const Brush& brush) override;
