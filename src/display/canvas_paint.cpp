@@ -42,6 +42,9 @@ class RowPainter {
         const std::size_t span = columns_.back() - columns_.front() + 1;
         consecutive_ = source.width() == target.width();
         if (span < columns_.size()) line_.resize(span);
+        if (source.width() % target.width() == 0) {
+            step_ = static_cast<std::size_t>(source.width() / target.width());
+        }
     }
 
     void paint(const std::uint8_t* row, std::uint32_t* to) {
@@ -61,22 +64,33 @@ class RowPainter {
         for (std::size_t i = 0; i < pixels; ++i) to[i] = load_le32(from + 4 * i) & 0xFFFFFFU;
     }
     void pick(const std::uint8_t* row, std::uint32_t* to) const {
-        const auto each = [&](auto pixel) {
-            for (std::size_t i = 0; i < columns_.size(); ++i) to[i] = pixel(columns_[i]);
-        };
-        if (bits_ == 8) return each([&](std::size_t x) { return row[x] * 0x010101U; });
-        if (bits_ == 32) {
-            return each([&](std::size_t x) { return load_le32(row + 4 * x) & 0xFFFFFFU; });
-        }
-        each([&](std::size_t x) {
+        const auto load_8 = [row](std::size_t x) { return row[x] * 0x010101U; };
+        const auto load_24 = [row](std::size_t x) {
             const std::uint8_t* at = row + 3 * x;
             return std::uint32_t{load_le16(at)} | std::uint32_t{at[2]} << 16U;
-        });
+        };
+        const auto load_32 = [row](std::size_t x) { return load_le32(row + 4 * x) & 0xFFFFFFU; };
+        if (bits_ == 8) return pick_each(load_8, to);
+        if (bits_ == 24) return pick_each(load_24, to);
+        pick_each(load_32, to);
+    }
+    // Steps of one length need no list; those of two, known beforehand, become vectors.
+    template <class Load>
+    void pick_each(const Load& load, std::uint32_t* to) const {
+        const std::size_t pixels = columns_.size(), first = columns_.front();
+        if (step_ == 2) {
+            for (std::size_t i = 0; i < pixels; ++i) to[i] = load(first + 2 * i);
+        } else if (step_ != 0) {
+            for (std::size_t i = 0, x = first; i < pixels; ++i, x += step_) to[i] = load(x);
+        } else {
+            for (std::size_t i = 0; i < pixels; ++i) to[i] = load(columns_[i]);
+        }
     }
 
     std::size_t bits_;
     std::vector<std::size_t> columns_;
     bool consecutive_;
+    std::size_t step_ = 0;             // from column to column where all are alike, else 0
     std::vector<std::uint32_t> line_;  // of an enlarged row
 };
 
