@@ -1,6 +1,7 @@
 // Images as bitmaps that a device context takes.
 #include "display/dib_rows.h"
 
+#include <algorithm>
 #include <cstring>
 
 #include "base/checked.h"
@@ -25,9 +26,11 @@ bool fits_in_place(const PixelView& view) {
 }
 
 template <class Row>
-void fill_rows(const PixelView& view, const Dib& dib, const DibScratch& scratch, const Row& row) {
-    for (std::int32_t y = 0; y < view.height; ++y) {
-        row(view.row(y), scratch.get() + static_cast<std::size_t>(y) * dib.stride());
+void fill_rows(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>& scratch,
+               const Row& row) {
+    for (std::int32_t y = 0; y < dib.height; ++y) {
+        row(view.row(dib.first_row + y),
+            scratch.data() + static_cast<std::size_t>(y) * dib.stride());
     }
 }
 
@@ -41,7 +44,7 @@ Range range_of(const PixelView& view) {
     return range;
 }
 
-void show_samples(const PixelView& view, const Dib& dib, const DibScratch& scratch) {
+void show_samples(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>& scratch) {
     const auto width = static_cast<std::size_t>(view.width);
     const bool full_range = view.right_shift == 0 && view.bit_depth == 0;
     Reduction reduction(view.bit_depth);
@@ -60,7 +63,7 @@ void show_samples(const PixelView& view, const Dib& dib, const DibScratch& scrat
 
 // Each row goes at once where the exchange of the quadrants takes it; an odd last row or column
 // stays.
-void show_spectrum(const PixelView& view, const Dib& dib, const DibScratch& scratch) {
+void show_spectrum(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>& scratch) {
     const double pixels = static_cast<double>(view.width) * view.height;
     const double scale = static_cast<float>(128.0 / pixels);
     const auto width = static_cast<std::size_t>(view.width);
@@ -69,7 +72,7 @@ void show_spectrum(const PixelView& view, const Dib& dib, const DibScratch& scra
         const bool moves = y < 2 * half_height;
         const std::size_t half = moves ? width / 2 : 0;
         const auto target = [&](std::int32_t row) {
-            return scratch.get() + static_cast<std::size_t>(row) * dib.stride();
+            return scratch.data() + static_cast<std::size_t>(row) * dib.stride();
         };
         const auto* from = reinterpret_cast<const float*>(view.row(y));
         if (moves) {
@@ -81,7 +84,7 @@ void show_spectrum(const PixelView& view, const Dib& dib, const DibScratch& scra
     }
 }
 
-void show(const PixelView& view, const Dib& dib, const DibScratch& scratch) {
+void show(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>& scratch) {
     const auto width = static_cast<std::size_t>(view.width);
     switch (view.type) {
         case PixelType::kI16:
@@ -125,7 +128,7 @@ PixelView PixelView::of(const Image& image) {
             .bit_depth = image.bit_depth()};
 }
 
-Dib make_dib(const PixelView& view, DibScratch& scratch) {
+Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch, RowRange rows) {
     const bool colour = view.type >= PixelType::kRgb;
     Dib dib{.width = view.width,
             .height = view.height,
@@ -137,14 +140,13 @@ Dib make_dib(const PixelView& view, DibScratch& scratch) {
         dib.bits = view.pixels;
         return dib;
     }
-    const std::uint64_t row_bytes =
-        (static_cast<std::uint64_t>(view.width) * static_cast<unsigned>(dib.bits_per_pixel) / 8 +
-         3) &
-        ~std::uint64_t{3};
-    // Not cleared, which would cost as much as some of the mappings.
-    scratch = std::make_unique_for_overwrite<std::uint8_t[]>(checked_narrow<std::size_t>(
-        checked_mul(row_bytes, static_cast<std::uint64_t>(view.height))));
-    dib.bits = scratch.get();
+    // The quadrants of a spectrum come from all over it.
+    if (view.type == PixelType::kComplex) rows = {};
+    dib.first_row = rows.first;
+    dib.height = std::min(rows.end, view.height) - rows.first;
+    const std::size_t bytes = checked_mul(dib.stride(), static_cast<std::size_t>(dib.height));
+    if (scratch.size() < bytes) scratch = std::vector<std::uint8_t>(bytes);
+    dib.bits = scratch.data();
     show(view, dib, scratch);
     return dib;
 }

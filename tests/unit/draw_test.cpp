@@ -51,7 +51,7 @@ PixelView view_of(const void* pixels, PixelType type, std::int32_t width, std::i
 }
 
 std::vector<int> shown(const PixelView& view) {
-    DibScratch scratch;
+    std::vector<std::uint8_t> scratch;
     const Dib dib = make_dib(view, scratch);
     std::vector<int> bytes;
     for (std::int32_t y = 0; y < view.height; ++y) {
@@ -175,7 +175,7 @@ TEST(Draw, TakesRowsInPlaceWhereTheyAreAligned) {
     for (const Case& c : cases) {
         PixelView view = view_of(pixels + c.offset, c.type, c.width, 2);
         view.packed_colour = c.packed;
-        DibScratch scratch;
+        std::vector<std::uint8_t> scratch;
         EXPECT_EQ(make_dib(view, scratch).bits == view.pixels, c.in_place)
             << c.offset << ' ' << c.width;
     }
