@@ -34,10 +34,11 @@ void fill_rows(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>&
     }
 }
 
+// From the last row up, so that the first rows, which are mapped next, are still in the cache.
 template <class Sample, class Range>
 Range range_of(const PixelView& view) {
     Range range;
-    for (std::int32_t y = 0; y < view.height; ++y) {
+    for (std::int32_t y = view.height - 1; y >= 0; --y) {
         widen_range(reinterpret_cast<const Sample*>(view.row(y)),
                     static_cast<std::size_t>(view.width), range);
     }

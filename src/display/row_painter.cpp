@@ -79,13 +79,14 @@ void RowPainter::expand(const std::uint8_t* from, std::uint32_t* to, std::size_t
 }
 
 void RowPainter::halve(const std::uint8_t* from, std::uint32_t* to) {
-    if (bits_ == 8) {
-        auto* bytes = reinterpret_cast<std::uint8_t*>(line_.data());
-        every_second_u8(from, bytes, columns_.size());
-        return u8_to_grey32(bytes, to, columns_.size(), Stores::kCached);
+    const std::size_t pixels = columns_.size();
+    if (bits_ == 24) return every_second_bgr(from, to, pixels);
+    if (bits_ == 32) {
+        return every_second_bgra(reinterpret_cast<const std::uint32_t*>(from), to, pixels);
     }
-    expand(from, line_.data(), line_.size());
-    every_second_u32(line_.data(), to, columns_.size());
+    auto* bytes = reinterpret_cast<std::uint8_t*>(line_.data());
+    every_second_u8(from, bytes, pixels);
+    u8_to_grey32(bytes, to, pixels, Stores::kCached);
 }
 
 void RowPainter::repeat(std::uint32_t* to) const {

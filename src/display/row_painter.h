@@ -30,7 +30,7 @@ class RowPainter {
     Pattern pattern_ = Pattern::kAny;
     std::size_t times_ = 0;            // kRepeated: target pixels of each column but the ends
     std::size_t head_ = 0;             // and of the first column
-    std::vector<std::uint32_t> line_;  // the source columns from the first to the last
+    std::vector<std::uint32_t> line_;  // source columns of a row, from the first that is wanted on
 };
 
 }  // namespace zq

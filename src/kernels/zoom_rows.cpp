@@ -22,10 +22,10 @@ void bgra_to_bgr0(const std::uint32_t* from, std::uint32_t* to, std::size_t pixe
 }
 
 // The pixel behind the last one that is wanted may not be there, so the last is left to the plain
-// loop.
-template <class T>
-HWY_INLINE void every_second(const T* HWY_RESTRICT from, T* HWY_RESTRICT to, std::size_t pixels) {
-    const hn::ScalableTag<T> tag;
+// loops.
+void every_second_u8(const std::uint8_t* HWY_RESTRICT from, std::uint8_t* HWY_RESTRICT to,
+                     std::size_t pixels) {
+    const hn::ScalableTag<std::uint8_t> tag;
     std::size_t done = 0;
     for (; done + hn::Lanes(tag) < pixels; done += hn::Lanes(tag)) {
         hn::Vec<decltype(tag)> even, odd;
@@ -35,12 +35,38 @@ HWY_INLINE void every_second(const T* HWY_RESTRICT from, T* HWY_RESTRICT to, std
     for (; done < pixels; ++done) to[done] = from[2 * done];
 }
 
-void every_second_u8(const std::uint8_t* from, std::uint8_t* to, std::size_t pixels) {
-    every_second(from, to, pixels);
+void every_second_bgra(const std::uint32_t* HWY_RESTRICT from, std::uint32_t* HWY_RESTRICT to,
+                       std::size_t pixels) {
+    const hn::ScalableTag<std::uint32_t> tag;
+    const auto colour = hn::Set(tag, 0xFFFFFFU);
+    std::size_t done = 0;
+    for (; done + hn::Lanes(tag) < pixels; done += hn::Lanes(tag)) {
+        hn::Vec<decltype(tag)> even, odd;
+        hn::LoadInterleaved2(tag, from + 2 * done, even, odd);
+        hn::StoreU(hn::And(even, colour), tag, to + done);
+    }
+    for (; done < pixels; ++done) to[done] = from[2 * done] & 0xFFFFFFU;
 }
 
-void every_second_u32(const std::uint32_t* from, std::uint32_t* to, std::size_t pixels) {
-    every_second(from, to, pixels);
+// Two pixels are three 16-bit words: blue and green, red and the next blue, the rest.
+void every_second_bgr(const std::uint8_t* HWY_RESTRICT from, std::uint32_t* HWY_RESTRICT to,
+                      std::size_t pixels) {
+    std::size_t done = 0;
+#if HWY_TARGET != HWY_SCALAR
+    const hn::ScalableTag<std::uint16_t> tag;
+    const auto low = hn::Set(tag, 0xFFU);
+    for (; done + hn::Lanes(tag) < pixels; done += hn::Lanes(tag)) {
+        hn::Vec<decltype(tag)> blue_green, red, other;
+        hn::LoadInterleaved3(tag, reinterpret_cast<const std::uint16_t*>(from + 6 * done),
+                             blue_green, red, other);
+        hn::StoreInterleaved2(blue_green, hn::And(red, low), tag,
+                              reinterpret_cast<std::uint16_t*>(to + done));
+    }
+#endif
+    for (; done < pixels; ++done) {
+        const std::uint8_t* at = from + 6 * done;
+        to[done] = std::uint32_t{at[0]} | std::uint32_t{at[1]} << 8U | std::uint32_t{at[2]} << 16U;
+    }
 }
 
 HWY_INLINE std::size_t repeat_twice(const std::uint32_t* HWY_RESTRICT from,
@@ -80,7 +106,8 @@ namespace zq {
 
 ZQ_EXPORT_ROW_KERNEL(bgra_to_bgr0, std::uint32_t, std::uint32_t);
 ZQ_EXPORT_ROW_KERNEL(every_second_u8, std::uint8_t, std::uint8_t);
-ZQ_EXPORT_ROW_KERNEL(every_second_u32, std::uint32_t, std::uint32_t);
+ZQ_EXPORT_ROW_KERNEL(every_second_bgr, std::uint8_t, std::uint32_t);
+ZQ_EXPORT_ROW_KERNEL(every_second_bgra, std::uint32_t, std::uint32_t);
 
 HWY_EXPORT(repeat_u32);
 
