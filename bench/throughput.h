@@ -41,7 +41,7 @@ inline Baseline memcpy_of(std::size_t bytes_per_pixel) {
 
 // Reports megapixels a second, and how many times the throughput of each baseline that is.
 inline void run_compared(benchmark::State& state, const Job& ours,
-                         const std::vector<Baseline>& baselines) {
+                         const std::vector<Baseline>& baselines, std::size_t pixels = kPixels) {
     ours();
     Times our_times;
     std::vector<std::pair<const Baseline*, Times>> others;
@@ -56,7 +56,7 @@ inline void run_compared(benchmark::State& state, const Job& ours,
         state.SetIterationTime(our_times.wall.back());
     }
     const double seconds = median(our_times.wall);
-    state.counters["Mpixel/s"] = static_cast<double>(kPixels) / seconds * 1e-6;
+    state.counters["Mpixel/s"] = static_cast<double>(pixels) / seconds * 1e-6;
     for (auto& [baseline, times] : others) {
         state.counters["x " + baseline->name] = median(times.wall) / seconds;
     }

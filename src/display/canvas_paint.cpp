@@ -2,10 +2,8 @@
 #include <algorithm>
 #include <cstring>
 
-#include "base/byte_order.h"
 #include "display/canvas.h"
-#include "kernels/colour_rows.h"
-#include "kernels/from_u8.h"
+#include "display/row_painter.h"
 
 namespace zq {
 namespace {
@@ -28,57 +26,16 @@ std::int64_t last_of_group(std::int64_t i, std::int64_t size, std::int64_t shown
     return first_of_group(i + 1, size, shown) - 1;
 }
 
-// Pixels of source rows as those of the canvas. One object paints all rows of a part.
-class RowPainter {
-  public:
-    RowPainter(const Dib& dib, const Box& source, const Box& target, const Box& part)
-        : bits_(static_cast<std::size_t>(dib.bits_per_pixel)),
-          columns_(static_cast<std::size_t>(part.width())) {
-        for (std::size_t i = 0; i < columns_.size(); ++i) {
-            const std::int64_t at = part.left + static_cast<std::int64_t>(i) - target.left;
-            columns_[i] = static_cast<std::size_t>(
-                source.left + last_of_group(at, source.width(), target.width()));
-        }
-        const std::size_t span = columns_.back() - columns_.front() + 1;
-        consecutive_ = source.width() == target.width();
-        if (span < columns_.size()) line_.resize(span);
+// The source column of each target column, so that rows need no division.
+std::vector<std::int32_t> source_columns(const Box& target, const Box& part, const Box& source) {
+    std::vector<std::int32_t> columns(static_cast<std::size_t>(part.width()));
+    for (std::size_t i = 0; i < columns.size(); ++i) {
+        const std::int64_t at = part.left + static_cast<std::int64_t>(i) - target.left;
+        columns[i] = static_cast<std::int32_t>(source.left +
+                                               last_of_group(at, source.width(), target.width()));
     }
-
-    void paint(const std::uint8_t* row, std::uint32_t* to) {
-        const std::size_t first = columns_.front();
-        if (consecutive_) return expand(row, to, columns_.size());
-        if (line_.empty()) return pick(row, to);
-        expand(row, line_.data(), line_.size());
-        for (std::size_t i = 0; i < columns_.size(); ++i) to[i] = line_[columns_[i] - first];
-    }
-
-  private:
-    // From the first column on.
-    void expand(const std::uint8_t* row, std::uint32_t* to, std::size_t pixels) const {
-        const std::uint8_t* from = row + columns_.front() * (bits_ / 8);
-        if (bits_ == 8) return u8_to_grey32(from, to, pixels, Stores::kCached);
-        if (bits_ == 24) return bgr_to_bgra(from, reinterpret_cast<std::uint8_t*>(to), pixels);
-        for (std::size_t i = 0; i < pixels; ++i) to[i] = load_le32(from + 4 * i) & 0xFFFFFFU;
-    }
-    void pick(const std::uint8_t* row, std::uint32_t* to) const {
-        const auto each = [&](auto pixel) {
-            for (std::size_t i = 0; i < columns_.size(); ++i) to[i] = pixel(columns_[i]);
-        };
-        if (bits_ == 8) return each([&](std::size_t x) { return row[x] * 0x010101U; });
-        if (bits_ == 32) {
-            return each([&](std::size_t x) { return load_le32(row + 4 * x) & 0xFFFFFFU; });
-        }
-        each([&](std::size_t x) {
-            const std::uint8_t* at = row + 3 * x;
-            return std::uint32_t{load_le16(at)} | std::uint32_t{at[2]} << 16U;
-        });
-    }
-
-    std::size_t bits_;
-    std::vector<std::size_t> columns_;
-    bool consecutive_;
-    std::vector<std::uint32_t> line_;  // of an enlarged row
-};
+    return columns;
+}
 
 // Lines in the lower half of each byte, as the system's brushes: bits that are set are gaps.
 constexpr std::array<Pattern, 6> kHatches = {{
@@ -98,7 +55,7 @@ void Canvas::stretch(const Dib& dib, const Box& source, const Box& destination) 
     for (const Box& clip : clip_) {
         const Box part = intersect(target, clip);
         if (part.empty()) continue;
-        RowPainter painter(dib, source, target, part);
+        RowPainter painter(dib.bits_per_pixel, source_columns(target, part, source));
         std::int64_t painted = -1;
         for (std::int32_t y = part.top; y < part.bottom; ++y) {
             const std::int64_t line =

@@ -1,6 +1,7 @@
 // Images as bitmaps that a device context takes.
 #include "display/dib_rows.h"
 
+#include <algorithm>
 #include <cstring>
 
 #include "base/checked.h"
@@ -27,15 +28,17 @@ bool fits_in_place(const PixelView& view) {
 template <class Row>
 void fill_rows(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>& scratch,
                const Row& row) {
-    for (std::int32_t y = 0; y < view.height; ++y) {
-        row(view.row(y), scratch.data() + static_cast<std::size_t>(y) * dib.stride());
+    for (std::int32_t y = 0; y < dib.height; ++y) {
+        row(view.row(dib.first_row + y),
+            scratch.data() + static_cast<std::size_t>(y) * dib.stride());
     }
 }
 
+// From the last row up, so that the first rows, which are mapped next, are still in the cache.
 template <class Sample, class Range>
 Range range_of(const PixelView& view) {
     Range range;
-    for (std::int32_t y = 0; y < view.height; ++y) {
+    for (std::int32_t y = view.height - 1; y >= 0; --y) {
         widen_range(reinterpret_cast<const Sample*>(view.row(y)),
                     static_cast<std::size_t>(view.width), range);
     }
@@ -126,7 +129,7 @@ PixelView PixelView::of(const Image& image) {
             .bit_depth = image.bit_depth()};
 }
 
-Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch) {
+Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch, RowRange rows) {
     const bool colour = view.type >= PixelType::kRgb;
     Dib dib{.width = view.width,
             .height = view.height,
@@ -138,12 +141,12 @@ Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch) {
         dib.bits = view.pixels;
         return dib;
     }
-    const std::uint64_t row_bytes =
-        (static_cast<std::uint64_t>(view.width) * static_cast<unsigned>(dib.bits_per_pixel) / 8 +
-         3) &
-        ~std::uint64_t{3};
-    scratch.resize(checked_narrow<std::size_t>(
-        checked_mul(row_bytes, static_cast<std::uint64_t>(view.height))));
+    // The quadrants of a spectrum come from all over it.
+    if (view.type == PixelType::kComplex) rows = {};
+    dib.first_row = rows.first;
+    dib.height = std::min(rows.end, view.height) - rows.first;
+    const std::size_t bytes = checked_mul(dib.stride(), static_cast<std::size_t>(dib.height));
+    if (scratch.size() < bytes) scratch = std::vector<std::uint8_t>(bytes);
     dib.bits = scratch.data();
     show(view, dib, scratch);
     return dib;

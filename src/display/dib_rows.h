@@ -2,6 +2,7 @@
 #pragma once
 
 #include <cstdint>
+#include <limits>
 #include <vector>
 
 #include "image/image.h"
@@ -30,8 +31,14 @@ struct PixelView {
     }
 };
 
-// The bitmap of a view that has pixels. `scratch` gets the rows that cannot be shown in place and
-// must live as long as the bitmap. Throws kNotEnoughMemory.
-Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch);
+struct RowRange {
+    std::int32_t first = 0;
+    std::int32_t end = std::numeric_limits<std::int32_t>::max();  // or beyond the view
+};
+
+// The bitmap of a view that has pixels, at least of some rows (one or more), by the range of the
+// whole view. `scratch` gets the rows that cannot be shown in place, grows as it must, and must
+// live as long as the bitmap. Throws kNotEnoughMemory.
+Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch, RowRange rows = {});
 
 }  // namespace zq

@@ -5,6 +5,7 @@
 #include <limits>
 
 #include "display/background.h"
+#include "display/scratch.h"
 
 namespace zq {
 namespace {
@@ -113,8 +114,10 @@ void draw(DeviceContext& dc, const PixelView& view, const Box& source_box,
         }
     }
     if (!lies_inside(source, view)) return;
-    std::vector<std::uint8_t> scratch;
-    Dib dib = make_dib(view, scratch);
+    Scratch scratch;
+    Dib dib = make_dib(view, scratch.bytes(), {source.top, source.bottom});
+    source.top -= dib.first_row;
+    source.bottom -= dib.first_row;
     dib.bottom_up = options.bottom_up;
     const bool equal_sizes =
         source.width() == destination.width() && source.height() == destination.height();

@@ -7,6 +7,10 @@
 // Must come after foreach_target.h.
 #include <hwy/highway.h>
 
+#include <algorithm>
+#include <cmath>
+#include <type_traits>
+
 #include "kernels/grey_range_scalar.h"
 #include "kernels/row_loop-inl.h"
 
@@ -23,8 +27,13 @@ HWY_INLINE void widen(const T* HWY_RESTRICT from, std::size_t pixels, Range& ran
     auto largest = hn::Set(tag, static_cast<T>(range.largest)), other_largest = largest;
     const auto take = [&](auto& low, auto& high, const T* at) HWY_ATTR {
         const auto value = hn::LoadU(tag, at);
-        low = hn::IfThenElse(hn::Lt(value, low), value, low);
-        high = hn::IfThenElse(hn::Gt(value, high), value, high);
+        if constexpr (std::is_integral_v<T>) {
+            low = hn::Min(value, low);
+            high = hn::Max(value, high);
+        } else {
+            low = hn::IfThenElse(hn::Lt(value, low), value, low);
+            high = hn::IfThenElse(hn::Gt(value, high), value, high);
+        }
     };
     std::size_t done = 0;
     for (; done + 2 * lanes <= pixels; done += 2 * lanes) {
@@ -45,38 +54,103 @@ void widen_floats(const float* from, std::size_t pixels, FloatRange& range) {
     widen(from, pixels, range);
 }
 
-// Products below 2^24 are exact, and a quotient that is no whole number lies further from the next
-// one than rounding can carry it.
-void i16_to_u8_in_range(const std::int16_t* from, std::uint8_t* to, std::size_t pixels,
-                        SampleRange range) {
+#if HWY_NATIVE_FMA
+// Above this a quotient that is no whole number may lie within 255 * 2^-23 of the next one.
+constexpr std::int32_t kShortSpan = 32767;
+
+// The factor is above 255 / span by at most 2^-23 of it, so that products with it stay below the
+// next whole number, and none lies on one. Their sums with 2^23 - 0.5, which are rounded once, have
+// the whole number in the lowest bits.
+HWY_INLINE void map_short_range(const std::int16_t* from, std::uint8_t* to, std::size_t pixels,
+                                std::int32_t least, std::int32_t span) {
+    const hn::ScalableTag<float> tag;
+    const hn::RebindToSigned<decltype(tag)> words;
+    const hn::RebindToUnsigned<decltype(tag)> bits;
+    const hn::Rebind<std::int16_t, decltype(tag)> samples;
+    const hn::Rebind<std::uint8_t, decltype(tag)> bytes;
+    const float nearest = 255.0F / static_cast<float>(span);
+    const bool above_it = static_cast<double>(nearest) * span > 255.0;
+    const auto factor = hn::Set(tag, above_it ? nearest : std::nextafter(nearest, 256.0F));
+    const auto low = hn::Set(words, least);
+    const auto shift = hn::Set(tag, 0x1p23F - 0.5F);
+    map_row(samples, bytes, from, to, pixels, [&](auto sample) HWY_ATTR {
+        const auto above = hn::ConvertTo(tag, hn::Sub(hn::PromoteTo(words, sample), low));
+        const auto shifted = hn::Max(hn::MulAdd(above, factor, shift), hn::Set(tag, 0x1p23F));
+        return hn::TruncateTo(bytes, hn::BitCast(bits, shifted));
+    });
+}
+#endif
+
+// Products are below 2^24 and so exact. The rounded reciprocal gives the quotient or, where that is
+// a whole number, sometimes one less: a quotient that is no whole number lies further from the next
+// one than both roundings can carry it.
+HWY_INLINE void map_any_range(const std::int16_t* from, std::uint8_t* to, std::size_t pixels,
+                              std::int32_t least, std::int32_t span) {
     const hn::ScalableTag<float> tag;
     const hn::RebindToSigned<decltype(tag)> words;
     const hn::Rebind<std::int16_t, decltype(tag)> samples;
     const hn::Rebind<std::uint8_t, decltype(tag)> bytes;
-    const auto least = hn::Set(words, range.least);
-    const std::int32_t span = range.largest - range.least;
-    const auto divisor = hn::Set(tag, static_cast<float>(span < 1 ? 1 : span));
+    const auto low = hn::Set(words, least);
+    const auto divisor = hn::Set(tag, static_cast<float>(span));
+    const auto reciprocal = hn::Set(tag, std::nextafter(1.0F / static_cast<float>(span), 0.0F));
     map_row(samples, bytes, from, to, pixels, [&](auto sample) HWY_ATTR {
-        const auto above = hn::ConvertTo(tag, hn::Sub(hn::PromoteTo(words, sample), least));
-        const auto quotient = hn::Div(hn::Mul(above, hn::Set(tag, 255.0F)), divisor);
-        return hn::DemoteTo(bytes, hn::ConvertTo(words, quotient));
+        const auto above = hn::ConvertTo(tag, hn::Sub(hn::PromoteTo(words, sample), low));
+        const auto product = hn::Mul(above, hn::Set(tag, 255.0F));
+        const auto quotient = hn::Trunc(hn::Mul(product, reciprocal));
+        const auto rest = hn::Sub(product, hn::Mul(quotient, divisor));
+        const auto one = hn::IfThenElseZero(hn::Ge(rest, divisor), hn::Set(tag, 1.0F));
+        return hn::DemoteTo(bytes, hn::ConvertTo(words, hn::Add(quotient, one)));
     });
 }
 
-void f32_to_u8_in_range(const float* from, std::uint8_t* to, std::size_t pixels, FloatRange range) {
+void i16_to_u8_in_range(const std::int16_t* from, std::uint8_t* to, std::size_t pixels,
+                        SampleRange range) {
+    const std::int32_t span = std::max(1, range.largest - range.least);
+#if HWY_NATIVE_FMA
+    if (span <= kShortSpan) return map_short_range(from, to, pixels, range.least, span);
+#endif
+    map_any_range(from, to, pixels, range.least, span);
+}
+
+// divide(numerator) makes quotients.
+template <class Divide>
+HWY_INLINE void map_floats(const float* from, std::uint8_t* to, std::size_t pixels, float least,
+                           const Divide& divide) {
     const hn::ScalableTag<float> tag;
     const hn::RebindToSigned<decltype(tag)> words;
     const hn::Rebind<std::uint8_t, decltype(tag)> bytes;
-    const auto least = hn::Set(tag, range.least);
-    const auto divisor = hn::Set(tag, range.largest - range.least);
+    const hn::RebindToUnsigned<decltype(tag)> bits;
+    const auto low = hn::Set(tag, least);
     const auto limit = hn::Set(tag, 2147483648.0F);
     map_row(tag, bytes, from, to, pixels, [&](auto value) HWY_ATTR {
-        const auto quotient =
-            hn::Div(hn::Mul(hn::Sub(value, least), hn::Set(tag, 255.0F)), divisor);
-        const auto fits = hn::And(hn::Ge(quotient, hn::Neg(limit)), hn::Lt(quotient, limit));
+        const auto quotient = divide(hn::Mul(hn::Sub(value, low), hn::Set(tag, 255.0F)));
+        const auto fits = hn::Lt(hn::Abs(quotient), limit);
         const auto word = hn::ConvertTo(words, hn::IfThenElseZero(fits, quotient));
-        return hn::DemoteTo(bytes, hn::And(word, hn::Set(words, 255)));
+        return hn::TruncateTo(bytes, hn::BitCast(bits, word));
     });
+}
+
+// Where products and sums are rounded once, two corrections of a product with the rounded
+// reciprocal give the rounded quotient: the first is within a unit in the last place, and from such
+// the second is exact (P. Markstein, 1990). Nothing below 1 matters, and what overflows becomes NaN
+// and so 0, as the quotient does; but the divisor and its reciprocal must be far from both ends.
+void f32_to_u8_in_range(const float* from, std::uint8_t* to, std::size_t pixels, FloatRange range) {
+    const hn::ScalableTag<float> tag;
+    const float span = range.largest - range.least;
+    const auto divisor = hn::Set(tag, span);
+#if HWY_NATIVE_FMA
+    if (span > 0x1p-100F && span < 0x1p100F) {
+        const auto reciprocal = hn::Set(tag, 1.0F / span);
+        return map_floats(from, to, pixels, range.least, [&](auto numerator) HWY_ATTR {
+            const auto rough = hn::Mul(numerator, reciprocal);
+            const auto near =
+                hn::MulAdd(hn::NegMulAdd(rough, divisor, numerator), reciprocal, rough);
+            return hn::MulAdd(hn::NegMulAdd(near, divisor, numerator), reciprocal, near);
+        });
+    }
+#endif
+    map_floats(from, to, pixels, range.least,
+               [&](auto numerator) HWY_ATTR { return hn::Div(numerator, divisor); });
 }
 
 }  // namespace zq::HWY_NAMESPACE

@@ -46,9 +46,10 @@ struct Dib {
     std::int32_t height = 0;
     std::int32_t bits_per_pixel = 8;  // 8 grey, 24, 32
     bool bottom_up = false;
+    std::int32_t first_row = 0;  // of the image that the bitmap holds rows of
 
     std::size_t stride() const {
-        return (static_cast<std::size_t>(width) * static_cast<std::size_t>(bits_per_pixel) / 8 +
+        return (static_cast<std::size_t>(width) * static_cast<std::size_t>(bits_per_pixel / 8) +
                 3) &
                ~std::size_t{3};
     }

@@ -103,12 +103,13 @@ TEST(Display, ZoomsOverThePattern) {
 }
 
 TEST(Display, ClippedDrawsShowWhatWholeOnesShowThere) {
-    std::vector<uint8_t> pixels(20 * 20);
-    for (size_t i = 0; i < pixels.size(); ++i) pixels[i] = static_cast<uint8_t>(1 + i % 200);
+    // In place as bytes, mapped as samples.
+    std::vector<uint16_t> pixels(20 * 20);
+    for (size_t i = 0; i < pixels.size(); ++i) pixels[i] = static_cast<uint16_t>(4 + i % 200 * 5);
     const ZqCoordinates clips[] = {{3, 5, 11, 9}, {0, 19, 20, 20}, {7, 0, 8, 20}};
     for (const int32_t zoom : {1, 2, 7, 16, -2, -3}) {
         for (const int32_t offset : {0, 1, 7, 9}) {
-            for (const uint32_t flags : {0U, 1U}) {
+            for (const uint32_t flags : {0U, 1U, 8U, 9U}) {
                 const auto draw = [&](const TestCanvas& canvas) {
                     Gen_PlotZoomedImage(canvas.handle, pixels.data(), zoom, 20, 20, offset, offset,
                                         flags, nullptr);

@@ -8,6 +8,7 @@
 
 #include "kernels/grey_range_scalar.h"
 #include "support/simd_targets.h"
+#include "support/thoroughness.h"
 
 namespace zq {
 namespace {
@@ -32,12 +33,14 @@ TEST(GreyRange, SamplesOfEveryValueAndRange) {
             }
             compare(all, SampleRange{least, largest}, i16_to_u8_in_range);
         }
-        // Every quotient that is just below a whole number, for every length of a range.
+        // Every quotient that is just below a whole number, and the next one, for every length of a
+        // range.
         for (std::int32_t span = 1; span <= 65535; ++span) {
-            std::vector<std::int16_t> critical;
-            for (std::int32_t step = 1; step <= 255; step += 1 + span % 7) {
+            std::vector<std::int16_t> critical = {-32768};
+            for (std::int32_t step = 1; step <= 255; step += zqtest::kThorough ? 1 : 7) {
                 const std::int32_t sample = (step * span - 1) / 255 - 32768;
                 critical.push_back(static_cast<std::int16_t>(sample));
+                critical.push_back(static_cast<std::int16_t>(sample + 1));
             }
             compare(critical, SampleRange{-32768, span - 32768}, i16_to_u8_in_range);
         }
@@ -46,15 +49,19 @@ TEST(GreyRange, SamplesOfEveryValueAndRange) {
 
 TEST(GreyRange, FloatsOfEveryKind) {
     const float inf = std::numeric_limits<float>::infinity(), nan = std::nanf("");
-    const FloatRange ranges[] = {{0, 1},         {-3, 1e-38F},    {-inf, 5},  {2, inf},    {7, 7},
-                                 {1e-3F, 3e-3F}, {-3e38F, 3e38F}, {0, 3e38F}, FloatRange()};
+    const FloatRange ranges[] = {{0, 1},       {-3, 1e-38F},     {-inf, 5},          {2, inf},
+                                 {7, 7},       {1e-3F, 3e-3F},   {-3e38F, 3e38F},    {0, 3e38F},
+                                 FloatRange(), {-0.1F, 88.3F},   {0, 0x1.fffffep5F}, {0, 255},
+                                 {3, 1e-30F},  {-1e-29F, 1e-30F}};
     std::mt19937 random(6);
     zqtest::on_every_simd_target([&] {
         for (const FloatRange& range : ranges) {
             std::vector<float> values = {inf, -inf, nan, 0, -0.0F, range.least, range.largest};
-            for (int i = 0; i < 3000; ++i) {
+            const int count = zqtest::kThorough ? 300'000 : 3000;
+            for (int i = 0; i < count; ++i) {
                 values.push_back(std::bit_cast<float>(static_cast<std::uint32_t>(random())));
-                values.push_back(static_cast<float>(i) * (range.largest - range.least) / 3000 +
+                values.push_back(static_cast<float>(i) * (range.largest - range.least) /
+                                     static_cast<float>(count) +
                                  range.least);
             }
             compare(values, range, f32_to_u8_in_range);
