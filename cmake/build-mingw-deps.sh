@@ -125,6 +125,13 @@ if begin zlib; then
     run install -D -m644 -t "$prefix/include" "$src/zlib.h" "$bld/zconf.h"
     finish lib/libz.a
 fi
+# Its fast code is for 64 bits; builds for 32 bits inflate with zlib.
+if [[ $arch == x86_64 ]] && begin libisal; then
+    run make -C "$src" -f Makefile.unx -j "$jobs" arch=mingw AS=nasm units="crc igzip" lib
+    run install -D -m644 "$src/bin/isa-l.a" "$prefix/lib/libisal.a"
+    run install -D -m644 -t "$prefix/include/isa-l" "$src"/include/{igzip_lib,types}.h
+    finish lib/libisal.a include/isa-l/igzip_lib.h
+fi
 if begin libpng1.6; then
     # The pattern "^i?86" never matches i686 and would leave out the SSE2 row filters.
     run sed -i 's/"^i?86"/"^i.86"/' "$src/CMakeLists.txt"

@@ -98,7 +98,7 @@ inline void read_target(const std::uint8_t* bytes, std::size_t size, Reader read
     if (code != kSuccess) {
         constexpr std::array known = {kNotEnoughMemory,     kInvalidFileHeader, kFileIo,
                                       kUnsupportedFileType, kUnableToReadData,  kColourSpaceMethod,
-                                      kMoreThanOneLayer};
+                                      kMoreThanOneLayer,    kInvalidParameter};
         require(std::find(known.begin(), known.end(), code) != known.end(), "a known code");
         require(state_of(target) == before, "a target left alone");
         return;

@@ -12,8 +12,8 @@ die() { printf 'dev: %s\n' "$*" >&2; exit 1; }
 
 # ---- Debian packages
 
-kLibraries=(zlib1g-dev libpng-dev libjpeg62-turbo-dev libtiff-dev libopenjp2-7-dev libhwy-dev libgtest-dev libgmock-dev
-    libbenchmark-dev libcli11-dev libfmt-dev nlohmann-json3-dev)
+kLibraries=(zlib1g-dev libisal-dev libpng-dev libjpeg62-turbo-dev libtiff-dev libopenjp2-7-dev libhwy-dev libgtest-dev
+    libgmock-dev libbenchmark-dev libcli11-dev libfmt-dev nlohmann-json3-dev)
 kTools=(git cmake ninja-build ccache g++ binutils)
 kCross=(nasm dpkg-dev g++-mingw-w64-x86-64-posix g++-mingw-w64-i686-posix)
 kOtherCross=(gcc-mingw-w64-x86-64-win32 gcc-mingw-w64-i686-win32 clang)   # tests/contract

@@ -14,8 +14,9 @@ package() {
     mkdir -p dist "$stage/$name"
     cmake --install "build/win$1" --prefix "$stage/$name" --strip >/dev/null
     mkdir -p "$stage/$name/licenses"
-    local part
-    for part in zlib libpng1.6 libjpeg-turbo tiff openjpeg2 highway cli11 fmtlib nlohmann-json3; do
+    local part parts=(zlib libpng1.6 libjpeg-turbo tiff openjpeg2 highway cli11 fmtlib nlohmann-json3)
+    [[ $1 == 32 ]] || parts+=(libisal)
+    for part in "${parts[@]}"; do
         cp "$(mingw_prefix "$2")/share/licenses/$part" "$stage/$name/licenses/"
     done
     (cd "$stage" && cmake -E tar cf "$OLDPWD/dist/$name.zip" --format=zip "$name")

@@ -1,7 +1,9 @@
 // Reading and writing integers of a stated byte order in plain bytes.
 #pragma once
 
+#include <bit>
 #include <cstdint>
+#include <cstring>
 
 namespace zq {
 
@@ -29,6 +31,14 @@ constexpr void store_le16(std::uint8_t* bytes, std::uint16_t value) {
 constexpr void store_le32(std::uint8_t* bytes, std::uint32_t value) {
     for (int i = 0; i < 4; ++i) {
         bytes[i] = static_cast<std::uint8_t>(value >> (8 * i));
+    }
+}
+inline void store_le64(std::uint8_t* bytes, std::uint64_t value) {
+    if constexpr (std::endian::native == std::endian::little) {
+        std::memcpy(bytes, &value, sizeof value);
+    } else {
+        store_le32(bytes, static_cast<std::uint32_t>(value));
+        store_le32(bytes + 4, static_cast<std::uint32_t>(value >> 32));
     }
 }
 

@@ -1,22 +1,20 @@
-// Reading PNG. libpng delivers rows in the layout of the image's type, straight into the image.
+// Reading PNG. Rows of common layouts are decoded here; libpng delivers all others in the layout of
+// the image's type, straight into the image.
 #include "files/png_reader.h"
 
 #include <cstring>
 
 #include "base/checked.h"
 #include "codecs/deflate.h"
+#include "files/png_pixel_reader.h"
 #include "files/unsigned_grey.h"
 #include "files/write_job.h"
 #include "kernels/colour_rows.h"
+#include "kernels/png_samples.h"
 
 namespace zq {
 
 namespace {
-
-void read_bytes(png_structp png, png_bytep bytes, std::size_t count) {
-    auto* file = static_cast<InputFile*>(png_get_io_ptr(png));
-    if (file->read_some(bytes, count) != count) PngSession::fail(png, kUnableToReadData);
-}
 
 // Everything but the picture is passed over unread: nothing that a file carries beside its pixels
 // costs memory or can be wrong.
@@ -29,11 +27,23 @@ void skip_extras(png_structp png) {
 PngReader::PngReader(InputFile& file, std::optional<std::int16_t> sample_offset)
     : file_(file), session_(PngSession::Use::kRead), sample_offset_(sample_offset) {}
 
+void PngReader::read_bytes(png_structp png, png_bytep bytes, std::size_t count) {
+    auto& reader = *static_cast<PngReader*>(png_get_io_ptr(png));
+    const bool is_head = count == reader.head_.size();
+    if (is_head && reader.head_is_next_) {
+        reader.head_is_next_ = false;
+        std::memcpy(bytes, reader.head_.data(), count);
+        return;
+    }
+    if (reader.file_.read_some(bytes, count) != count) PngSession::fail(png, kUnableToReadData);
+    if (is_head) std::memcpy(reader.head_.data(), bytes, count);
+}
+
 void PngReader::read_info() {
     const png_structp png = session_.png();
     const png_infop info = session_.info();
     session_.run(kInvalidFileHeader, [this, png, info] {
-        png_set_read_fn(png, &file_, read_bytes);
+        png_set_read_fn(png, this, read_bytes);
         png_set_sig_bytes(png, kPngSignatureBytes);
         skip_extras(png);
         png_read_info(png, info);
@@ -101,15 +111,15 @@ std::vector<std::uint32_t> PngReader::colour_table() const {
     return table;
 }
 
-// The one layout whose rows are expanded here, which is much faster than libpng's way. Rows that
-// are put together from several passes must have their final form all the time.
-bool PngReader::is_plain_rgb() const {
-    return colour_type_ == PNG_COLOR_TYPE_RGB && depth_ == 8 && !interlaced_ &&
-           png_get_valid(session_.png(), session_.info(), PNG_INFO_tRNS) == 0;
+// Whole bytes in one pass, with no colour that stands for transparency.
+bool PngReader::is_common() const {
+    const bool has_key = (colour_type_ & PNG_COLOR_MASK_PALETTE) == 0 &&
+                         (colour_type_ & PNG_COLOR_MASK_COLOR) != 0 &&
+                         png_get_valid(session_.png(), session_.info(), PNG_INFO_tRNS) != 0;
+    return depth_ >= 8 && !interlaced_ && !has_key && colour_type_ != PNG_COLOR_TYPE_GRAY_ALPHA;
 }
 
-// The functions up to read_row are called inside a step.
-
+// Called inside a step.
 void PngReader::set_transformations() {
     const png_structp png = session_.png();
     if (depth_ == 16) png_set_swap(png);
@@ -121,7 +131,6 @@ void PngReader::set_transformations() {
         case PixelType::kI16:
             break;
         default:
-            if (is_plain_rgb()) break;
             if ((colour_type_ & PNG_COLOR_MASK_COLOR) == 0) png_set_gray_to_rgb(png);
             if (png_get_valid(png, session_.info(), PNG_INFO_tRNS) != 0) png_set_tRNS_to_alpha(png);
             png_set_filler(png, 0, PNG_FILLER_AFTER);
@@ -130,14 +139,9 @@ void PngReader::set_transformations() {
     }
 }
 
-void PngReader::read_row(std::uint8_t* row) {
-    png_read_row(session_.png(), packed_.empty() ? row : packed_.data(), nullptr);
-    if (!packed_.empty()) rgb_to_bgra(packed_.data(), row, width_);
-}
-
-void PngReader::read_pixels(Image& image) {
+// Returns whether a sample of 16-bit grey was above what is signed.
+bool PngReader::read_uncommon(Image& image) {
     const png_structp png = session_.png();
-    const bool is_16_bit_grey = pixel_type() == PixelType::kI16;
     int passes = 0;
     session_.run(kUnableToReadData, [this, png, &passes] {
         set_transformations();
@@ -146,26 +150,71 @@ void PngReader::read_pixels(Image& image) {
     });
     const auto row_bytes =
         static_cast<std::size_t>(width()) * static_cast<std::size_t>(bytes_per_pixel(image.type()));
-    const std::size_t delivered = png_get_rowbytes(png, session_.info());
-    if (is_plain_rgb()) {
-        packed_.resize(delivered);
-    } else if (delivered != row_bytes) {
-        throw kUnableToReadData;
-    }
+    if (png_get_rowbytes(png, session_.info()) != row_bytes) throw kUnableToReadData;
     bool above_signed = false;
     session_.run(kUnableToReadData, [&] {
         for (int pass = 0; pass < passes; ++pass) {
             for (std::int32_t y = 0; y < height(); ++y) {
-                read_row(image.row(y));
-                if (is_16_bit_grey && pass + 1 == passes && !above_signed) {
+                png_read_row(png, image.row(y), nullptr);
+                if (pixel_type() == PixelType::kI16 && pass + 1 == passes && !above_signed) {
                     above_signed = any_above_signed(image.row(y), row_bytes);
                 }
             }
         }
-        // A file that lacks its end is a file cut short.
-        png_read_end(png, nullptr);
     });
-    if (is_16_bit_grey) apply_sample_offset(image, above_signed);
+    return above_signed;
+}
+
+void PngReader::place_row(const std::uint8_t* from, std::uint8_t* to) const {
+    const bool has_alpha = colour_type_ == PNG_COLOR_TYPE_RGB_ALPHA;
+    switch (pixel_type()) {
+        case PixelType::kI16:
+            return swap_bytes_16(from, to, width_);
+        case PixelType::kRgb:
+            return (has_alpha ? swap_red_blue : rgb_to_bgra)(from, to, width_);
+        default:
+            return (has_alpha ? swap_red_blue_16 : rgb16_to_bgra16)(from, to, width_);
+    }
+}
+
+// libpng has read the head of the first chunk of pixels, and goes on behind the last.
+bool PngReader::read_common(Image& image) {
+    const auto step = static_cast<std::size_t>(bits_per_pixel()) / 8;
+    const std::size_t row_bytes = checked_mul<std::size_t>(width_, step);
+    PngPixelReader pixels(file_, head_, row_bytes, step);
+    const bool is_direct = pixel_type() == PixelType::kU8;
+    std::vector<std::uint8_t> row(is_direct ? 0 : row_bytes), above(row_bytes);
+    const std::uint8_t* before = above.data();
+    bool above_signed = false;
+    for (std::int32_t y = 0; y < height(); ++y) {
+        std::uint8_t* to = image.row(y);
+        if (is_direct) {
+            pixels.read_row(before, to);
+            before = to;
+            continue;
+        }
+        pixels.read_row(above.data(), row.data());
+        place_row(row.data(), to);
+        if (pixel_type() == PixelType::kI16 && !above_signed) {
+            above_signed = any_above_signed(to, row_bytes);
+        }
+        std::swap(row, above);
+    }
+    head_ = pixels.finish();
+    head_is_next_ = true;
+    session_.run(kUnableToReadData, [this] {
+        // libpng would look for the end of what it did not inflate.
+        png_set_keep_unknown_chunks(session_.png(), PNG_HANDLE_CHUNK_NEVER,
+                                    reinterpret_cast<png_const_bytep>("IDAT"), 1);
+    });
+    return above_signed;
+}
+
+void PngReader::read_pixels(Image& image) {
+    const bool above_signed = is_common() ? read_common(image) : read_uncommon(image);
+    // A file that lacks its end is a file cut short.
+    session_.run(kUnableToReadData, [this] { png_read_end(session_.png(), nullptr); });
+    if (pixel_type() == PixelType::kI16) apply_sample_offset(image, above_signed);
 }
 
 // Samples are unsigned, pixels signed. A file that does not say what was subtracted from its

@@ -1,6 +1,8 @@
-// Reads a PNG stream into an image through libpng: header, limits, colour table, pixels.
+// Reads a PNG stream into an image: header, limits and colour table through libpng, and the pixels
+// of uncommon layouts too.
 #pragma once
 
+#include <array>
 #include <cstdint>
 #include <optional>
 #include <vector>
@@ -37,8 +39,11 @@ class PngReader {
 
   private:
     void check_plausible() const;
-    bool is_plain_rgb() const;
-    void read_row(std::uint8_t* row);
+    bool is_common() const;
+    bool read_common(Image& image);
+    void place_row(const std::uint8_t* from, std::uint8_t* to) const;
+    bool read_uncommon(Image& image);
+    static void read_bytes(png_structp png, png_bytep bytes, std::size_t count);
     void set_transformations();
     void apply_sample_offset(Image& image, bool samples_above_signed) const;
 
@@ -50,7 +55,9 @@ class PngReader {
     int colour_type_ = 0;
     int channels_ = 0;
     bool interlaced_ = false;
-    std::vector<std::uint8_t> packed_;  // a row as the file holds it; empty when not needed
+    // The head of a chunk: the last that libpng read, or the next that it is to be given.
+    std::array<std::uint8_t, 8> head_{};
+    bool head_is_next_ = false;
     std::optional<std::int16_t> sample_offset_;
 };
 

@@ -1,10 +1,14 @@
-// Writing PNG. libpng turns rows from the layout of the image's type into the file's.
+// Writing PNG: libpng's chunks, and rows in the layout of the file. Rows that are no photograph's,
+// or are not filtered, are libpng's to compress; stored ones are not.
 #include "files/png_writer.h"
 
 #include <algorithm>
 #include <array>
 
 #include "files/alpha_in_use.h"
+
+#include "kernels/colour_rows.h"
+#include "kernels/png_samples.h"
 
 namespace zq {
 
@@ -114,14 +118,15 @@ void PngWriter::set_header() {
                  PNG_INTERLACE_NONE, PNG_COMPRESSION_TYPE_DEFAULT, PNG_FILTER_TYPE_DEFAULT);
 }
 
+PngCompression PngWriter::compression() const {
+    if (!job_.options.present) return {};
+    return png_compression(job_.options.words[0], layout_.colour_type, layout_.table_has_alpha);
+}
+
 void PngWriter::set_compression() {
-    PngCompression compression;
-    if (job_.options.present) {
-        compression =
-            png_compression(job_.options.words[0], layout_.colour_type, layout_.table_has_alpha);
-    }
-    png_set_compression_level(session_.png(), compression.level);
-    png_set_filter(session_.png(), PNG_FILTER_TYPE_BASE, compression.filters);
+    const PngCompression chosen = compression();
+    png_set_compression_level(session_.png(), chosen.level);
+    png_set_filter(session_.png(), PNG_FILTER_TYPE_BASE, chosen.filters);
 }
 
 // libpng writes texts before chunks that it does not know; so it is given neither.
@@ -153,6 +158,36 @@ void PngWriter::write_info() {
         write_chunks();
         set_transformations();
     });
+    const PngCompression chosen = compression();
+    if (chosen.filters == PNG_FILTER_NONE && chosen.level > 0) return;
+    const std::size_t step = png_get_channels(session_.png(), session_.info()) *
+                             static_cast<std::size_t>(layout_.depth / 8);
+    const std::size_t row_bytes = static_cast<std::size_t>(job_.pixels.width) * step;
+    if (chosen.level > 0 && !is_photograph(row_bytes, step)) return;
+    pixels_.emplace(session_, chosen, row_bytes, step);
+}
+
+// By some rows from all over the picture. Drawings and tiny pictures are libpng's: they live from
+// matches of all lengths.
+bool PngWriter::is_photograph(std::size_t row_bytes, std::size_t step) {
+    constexpr std::size_t kTiny = 65536, kDrawnPercent = 70;
+    constexpr std::int32_t kSamples = 32;
+    const std::int32_t height = job_.pixels.height;
+    if (row_bytes < kTiny / static_cast<std::size_t>(height)) return false;
+    std::vector<std::uint8_t> above(kPngMostStep + row_bytes), row = above, filtered(row_bytes);
+    std::size_t sampled = 0, zeros = 0;
+    for (std::int32_t i = 0; i < kSamples; ++i) {
+        const auto y = static_cast<std::int32_t>(std::int64_t{height} * i / kSamples);
+        if (y == 0) continue;
+        put_row(y - 1, &above[kPngMostStep]);
+        put_row(y, &row[kPngMostStep]);
+        png_filter(PNG_FILTER_VALUE_PAETH, &row[kPngMostStep], &above[kPngMostStep], step,
+                   filtered.data(), row_bytes);
+        zeros +=
+            static_cast<std::size_t>(std::count(filtered.begin(), filtered.end(), std::uint8_t{0}));
+        sampled += row_bytes;
+    }
+    return zeros < sampled / 100 * kDrawnPercent;
 }
 
 const std::uint8_t* PngWriter::samples_of_row(std::int32_t y) {
@@ -165,7 +200,39 @@ const std::uint8_t* PngWriter::samples_of_row(std::int32_t y) {
     return reinterpret_cast<const std::uint8_t*>(shifted_.data());
 }
 
+// In the file's layout.
+void PngWriter::put_row(std::int32_t y, std::uint8_t* to) {
+    const std::uint8_t* from = samples_of_row(y);
+    const auto width = static_cast<std::size_t>(job_.pixels.width);
+    const bool has_alpha = layout_.colour_type == PNG_COLOR_TYPE_RGB_ALPHA;
+    switch (job_.pixels.type) {
+        case PixelType::kU8:
+            std::memcpy(to, from, width);
+            break;
+        case PixelType::kI16:
+            swap_bytes_16(from, to, width);
+            break;
+        case PixelType::kRgbU64:
+            (has_alpha ? swap_red_blue_16 : bgra16_to_rgb16)(from, to, width);
+            break;
+        default:
+            if (job_.pixels.packing == Packing::kPacked24) {
+                bgr_to_rgb(from, to, width);
+            } else {
+                (has_alpha ? swap_red_blue : bgra_to_rgb)(from, to, width);
+            }
+            break;
+    }
+}
+
 void PngWriter::write_rows() {
+    if (pixels_) {
+        for (std::int32_t y = 0; y < job_.pixels.height; ++y) {
+            put_row(y, pixels_->row());
+            pixels_->put_row();
+        }
+        return pixels_->finish();
+    }
     session_.run(kUnableToWriteData, [this] {
         for (std::int32_t y = 0; y < job_.pixels.height; ++y) {
             png_write_row(session_.png(), samples_of_row(y));
@@ -173,8 +240,16 @@ void PngWriter::write_rows() {
     });
 }
 
+// Nothing but the end itself stands behind the pixels; and libpng would miss those that it did not
+// write.
 void PngWriter::write_end() {
-    session_.run(kUnableToWriteData, [this] { png_write_end(session_.png(), session_.info()); });
+    session_.run(kUnableToWriteData, [this] {
+        if (pixels_) {
+            png_write_chunk(session_.png(), reinterpret_cast<png_const_bytep>("IEND"), nullptr, 0);
+        } else {
+            png_write_end(session_.png(), session_.info());
+        }
+    });
 }
 
 }  // namespace zq

@@ -2,20 +2,16 @@
 #pragma once
 
 #include <cstdint>
+#include <optional>
 #include <vector>
 
 #include "files/output_file.h"
 #include "files/png_description.h"
+#include "files/png_pixel_writer.h"
 #include "files/png_session.h"
 #include "files/write_job.h"
 
 namespace zq {
-
-// How hard a write tries.
-struct PngCompression {
-    int level = 6;  // of zlib
-    int filters = PNG_ALL_FILTERS;
-};
 
 // `setting` is 0 (smallest file) to 100 (no compression).
 PngCompression png_compression(std::int32_t setting, int colour_type, bool has_transparency);
@@ -37,10 +33,13 @@ class PngWriter {
   private:
     void choose_layout();
     void set_header();
+    PngCompression compression() const;
     void set_compression();
     void write_chunks();
     void set_transformations();
     const std::uint8_t* samples_of_row(std::int32_t y);
+    void put_row(std::int32_t y, std::uint8_t* to);
+    bool is_photograph(std::size_t row_bytes, std::size_t step);
 
     OutputFile& file_;
     const WriteJob& job_;
@@ -48,7 +47,8 @@ class PngWriter {
     PngLayout layout_;
     ZqPngSettings settings_{};
     std::vector<PngChunk> chunks_;
-    std::vector<std::uint16_t> shifted_;  // one row less the sample offset; empty when that is 0
+    std::vector<std::uint16_t> shifted_;    // one row less the sample offset; empty when that is 0
+    std::optional<PngPixelWriter> pixels_;  // none: libpng writes the pixels
 };
 
 }  // namespace zq

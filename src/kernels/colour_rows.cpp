@@ -47,18 +47,34 @@ void bgr_to_bgra(const std::uint8_t* HWY_RESTRICT source, std::uint8_t* HWY_REST
     scalar::bgr_to_bgra(source + 3 * done, destination + 4 * done, pixels - done);
 }
 
-void bgra_to_bgr(const std::uint8_t* HWY_RESTRICT source, std::uint8_t* HWY_RESTRICT destination,
-                 std::size_t pixels) {
+// Drops the fourth byte; returns the pixels that are done.
+template <bool kRedFirst>
+HWY_INLINE std::size_t narrow_bgra([[maybe_unused]] const std::uint8_t* HWY_RESTRICT source,
+                                   [[maybe_unused]] std::uint8_t* HWY_RESTRICT destination,
+                                   [[maybe_unused]] std::size_t pixels) {
     std::size_t done = 0;
 #if HWY_TARGET != HWY_SCALAR
     const hn::ScalableTag<std::uint8_t> tag;
     for (; done + hn::Lanes(tag) <= pixels; done += hn::Lanes(tag)) {
         auto blue = hn::Zero(tag), green = blue, red = blue, alpha = blue;
         hn::LoadInterleaved4(tag, source + 4 * done, blue, green, red, alpha);
-        hn::StoreInterleaved3(blue, green, red, tag, destination + 3 * done);
+        hn::StoreInterleaved3(kRedFirst ? red : blue, green, kRedFirst ? blue : red, tag,
+                              destination + 3 * done);
     }
 #endif
+    return done;
+}
+
+void bgra_to_bgr(const std::uint8_t* HWY_RESTRICT source, std::uint8_t* HWY_RESTRICT destination,
+                 std::size_t pixels) {
+    const std::size_t done = narrow_bgra<false>(source, destination, pixels);
     scalar::bgra_to_bgr(source + 4 * done, destination + 3 * done, pixels - done);
+}
+
+void bgra_to_rgb(const std::uint8_t* HWY_RESTRICT source, std::uint8_t* HWY_RESTRICT destination,
+                 std::size_t pixels) {
+    const std::size_t done = narrow_bgra<true>(source, destination, pixels);
+    scalar::bgra_to_rgb(source + 4 * done, destination + 3 * done, pixels - done);
 }
 
 }  // namespace zq::HWY_NAMESPACE
@@ -70,6 +86,7 @@ namespace zq {
 HWY_EXPORT(rgb_to_bgra);
 HWY_EXPORT(bgr_to_bgra);
 HWY_EXPORT(bgra_to_bgr);
+HWY_EXPORT(bgra_to_rgb);
 
 void rgb_to_bgra(const std::uint8_t* source, std::uint8_t* destination, std::size_t pixels) {
     HWY_DYNAMIC_DISPATCH(rgb_to_bgra)(source, destination, pixels);
@@ -81,6 +98,10 @@ void bgr_to_bgra(const std::uint8_t* source, std::uint8_t* destination, std::siz
 
 void bgra_to_bgr(const std::uint8_t* source, std::uint8_t* destination, std::size_t pixels) {
     HWY_DYNAMIC_DISPATCH(bgra_to_bgr)(source, destination, pixels);
+}
+
+void bgra_to_rgb(const std::uint8_t* source, std::uint8_t* destination, std::size_t pixels) {
+    HWY_DYNAMIC_DISPATCH(bgra_to_rgb)(source, destination, pixels);
 }
 
 }  // namespace zq

@@ -15,5 +15,6 @@ void rgb_to_bgra(const std::uint8_t* source, std::uint8_t* destination, std::siz
 void bgr_to_bgra(const std::uint8_t* source, std::uint8_t* destination, std::size_t pixels);
 // Drops the alpha.
 void bgra_to_bgr(const std::uint8_t* source, std::uint8_t* destination, std::size_t pixels);
+void bgra_to_rgb(const std::uint8_t* source, std::uint8_t* destination, std::size_t pixels);
 
 }  // namespace zq

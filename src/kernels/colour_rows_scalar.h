@@ -32,4 +32,12 @@ inline void bgra_to_bgr(const std::uint8_t* source, std::uint8_t* destination, s
     }
 }
 
+inline void bgra_to_rgb(const std::uint8_t* source, std::uint8_t* destination, std::size_t pixels) {
+    for (std::size_t i = 0; i < pixels; ++i, source += 4, destination += 3) {
+        destination[0] = source[2];
+        destination[1] = source[1];
+        destination[2] = source[0];
+    }
+}
+
 }  // namespace zq::scalar

@@ -26,6 +26,7 @@ TEST(Kernels, ColourRowsEqualThePlainLoopAndStayInside) {
         {"rgb_to_bgra", 3, rgb_to_bgra, scalar::rgb_to_bgra},
         {"bgr_to_bgra", 3, bgr_to_bgra, scalar::bgr_to_bgra},
         {"bgra_to_bgr", 4, bgra_to_bgr, scalar::bgra_to_bgr},
+        {"bgra_to_rgb", 4, bgra_to_rgb, scalar::bgra_to_rgb},
     };
     std::mt19937 random(3);
     zqtest::on_every_simd_target([&] {

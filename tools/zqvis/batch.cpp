@@ -10,6 +10,7 @@
 
 #include "console.h"
 #include "failure.h"
+#include "interruption.h"
 
 namespace {
 
@@ -55,7 +56,14 @@ int run_batch(const std::vector<std::string>& files, bool quiet,
         report(file, code);
         status = kFailed;
     };
+    const Interruption interruption;
     for (size_t i = 0; i < files.size(); ++i) {
+        if (Interruption::requested()) {
+            bar.clear();
+            fmt::print(stderr, "zqvis: stopped after {} of {} files\n", i, files.size());
+            std::fflush(stdout);
+            Interruption::follow();
+        }
         bar.show(i, files[i]);
         try {
             const std::string text = work(files[i]);
