@@ -15,9 +15,13 @@ std::uint32_t pixel_of_colour(std::uint32_t bgr) {
 // Which of `size` source positions the target position i of `shown` takes, as the system's
 // colour-on-colour stretching does: enlarging repeats each; shrinking takes the first of each
 // group.
+// Targets have at most 2^32 positions and sources fewer than 2^31, so that unsigned products fit.
 std::int64_t first_of_group(std::int64_t i, std::int64_t size, std::int64_t shown) {
-    if (shown > size) return ((2 * i + 1) * size - 1) / (2 * shown);
-    return (2 * i * size + shown) / (2 * shown);
+    const auto at = static_cast<std::uint64_t>(i);
+    const auto from = static_cast<std::uint64_t>(size);
+    const auto to = static_cast<std::uint64_t>(shown);
+    return static_cast<std::int64_t>(to > from ? ((2 * at + 1) * from - 1) / (2 * to)
+                                               : (2 * at * from + to) / (2 * to));
 }
 
 // The last of each group: the same but for shrinking.
