@@ -1,6 +1,7 @@
 // Painting into a canvas: stretched bitmaps and brushes.
 #include <algorithm>
 #include <cstring>
+#include <limits>
 
 #include "display/canvas.h"
 #include "display/row_painter.h"
@@ -50,6 +51,26 @@ constexpr std::array<Pattern, 6> kHatches = {{
     {0xF7, 0xF7, 0xF7, 0x00, 0xF7, 0xF7, 0xF7, 0xF7},  // cross
     {0x7E, 0xBD, 0xDB, 0xE7, 0xE7, 0xDB, 0xBD, 0x7E},  // diagonal cross
 }};
+constexpr std::int32_t kHatchLimit = 12;  // below it, numbers without lines fill plainly
+
+std::int32_t end_after(std::int32_t last) {
+    return last == std::numeric_limits<std::int32_t>::max() ? last : last + 1;
+}
+
+// A side that runs backwards is filled from its start, which it includes, to its end, which it
+// does not.
+Box filled_area(const Box& box) {
+    Box result = box;
+    if (box.right < box.left) {
+        result.left = box.right + 1;
+        result.right = end_after(box.left);
+    }
+    if (box.bottom < box.top) {
+        result.top = box.bottom + 1;
+        result.bottom = end_after(box.top);
+    }
+    return result;
+}
 
 }  // namespace
 
@@ -79,23 +100,25 @@ void Canvas::stretch(const Dib& dib, const Box& source, const Box& destination) 
 }
 
 std::int32_t Canvas::fill(const Box& device, const Brush& brush) {
+    const Box area = filled_area(device);
     std::uint32_t set = pixel_of_colour(brush.background_colour);
     std::uint32_t unset = pixel_of_colour(brush.text_colour);
     Pattern pattern = brush.pattern;
     if (brush.kind != Brush::Kind::kPattern) unset = pixel_of_colour(brush.colour);
     if (brush.kind == Brush::Kind::kPlain) pattern = {};
     if (brush.kind == Brush::Kind::kHatch) {
-        if (brush.hatch < 0 || brush.hatch > 5) return 0;
-        pattern = kHatches[static_cast<std::size_t>(brush.hatch)];
+        if (brush.hatch < 0 || brush.hatch >= kHatchLimit) return 0;
+        const auto hatch = static_cast<std::size_t>(brush.hatch);
+        pattern = hatch < kHatches.size() ? kHatches[hatch] : Pattern{};
     }
     for (const Box& clip : clip_) {
-        const Box part = intersect(device, clip);
+        const Box part = intersect(area, clip);
         for (std::int32_t y = part.top; y < part.bottom; ++y) {
             const std::uint8_t bits =
-                pattern[static_cast<std::size_t>((y - std::int64_t{device.top}) % 8)];
+                pattern[static_cast<std::size_t>((y - std::int64_t{device.top}) & 7)];
             std::uint32_t* to = row(y);
             for (std::int32_t x = part.left; x < part.right; ++x) {
-                const auto column = static_cast<unsigned>((x - std::int64_t{device.left}) % 8);
+                const auto column = static_cast<unsigned>((x - std::int64_t{device.left}) & 7);
                 to[x] = (bits << column & 0x80U) != 0 ? set : unset;
             }
         }

@@ -68,12 +68,11 @@ class GdiContext final : public DeviceContext {
     }
     Box clip_box() override {
         // In device pixels first: what the system gives in logical units may miss pixels.
-        const Mapping kept = mapping();
-        const Mapping text;
-        set_mapping(text);
+        const int saved = SaveDC(dc_);
+        set_mapping({});
         RECT box{};
         const bool known = GetClipBox(dc_, &box) != ERROR;
-        set_mapping(kept);
+        RestoreDC(dc_, saved);
         return known ? covering(*this, box_of(box)) : Box{0, 0, 0, 0};
     }
     Box to_logical(const Box& device) override {

@@ -172,12 +172,13 @@ TEST(Gdi, ShowsImagesOfEveryTypeAsACanvasDoes) {
 }
 
 TEST(Gdi, PaintsBackgroundsAsACanvasDoes) {
-    const ZqCoordinates boxes[] = {{0, 0, kWidth, kHeight}, {3, 2, 30, 41}, {-5, -3, 20, 19}};
+    const ZqCoordinates boxes[] = {
+        {0, 0, kWidth, kHeight}, {3, 2, 30, 41}, {-5, -3, 20, 19}, {30, 41, 3, 2}};
     const ZqCoordinates hole = {9, 8, 25, 16};
     for (const ZqCoordinates& clip : kClips) {
         for (const ZqCoordinates& box : boxes) {
             for (int32_t style = 0; style <= 9; ++style) {
-                for (int32_t hatch = 0; hatch < (style == 2 ? 6 : 1); ++hatch) {
+                for (int32_t hatch = 0; hatch < (style == 2 ? 14 : 1); ++hatch) {
                     for (const bool excluded : {false, true}) {
                         compare(clip,
                                 "style " + std::to_string(style) + " hatch " +
