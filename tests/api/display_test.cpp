@@ -22,6 +22,7 @@ class TestCanvas {
     std::vector<int> row(int32_t y) const {
         const uint32_t* first = ZqGetCanvasPixels(handle) + y * width_;
         std::vector<int> blues;
+        blues.reserve(static_cast<size_t>(width_));
         for (int32_t x = 0; x < width_; ++x) blues.push_back(static_cast<int>(first[x] & 0xFF));
         return blues;
     }
