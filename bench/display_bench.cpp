@@ -40,15 +40,22 @@ class Canvas {
               "Gen_PlotZoomedImage");
     }
 
+    void clip(const ZqCoordinates& box) const {
+        check(ZqSetCanvasClip(handle_, &box) == 0, "ZqSetCanvasClip");
+    }
+
   private:
     ZqDeviceContext handle_ = nullptr;
 };
 
-// A picture of the client's size at this zoom is mapped in full, but next to nothing is painted.
+// A picture of the client's size at this zoom is mapped in full, but a single column is painted.
 constexpr int32_t kSmallest = -16;
 class SmallCanvas : public Canvas {
   public:
-    SmallCanvas() : Canvas(kClientWidth / 16, (kClientHeight + 15) / 16) {}
+    SmallCanvas() : Canvas(kClientWidth / 16, kHigh) { clip({5, 0, 6, kHigh}); }
+
+  private:
+    static constexpr int32_t kHigh = (kClientHeight + 15) / 16;
 };
 
 // The time that is wanted does not depend on the picture's size: "x tiny" near 1. Both cover the
