@@ -114,7 +114,7 @@ std::int32_t Canvas::fill(const Box& device, const Brush& brush) {
     for (const Box& clip : clip_) {
         const Box part = intersect(area, clip);
         for (std::int32_t y = part.top; y < part.bottom; ++y) {
-            const std::uint8_t bits =
+            const unsigned bits =
                 pattern[static_cast<std::size_t>((y - std::int64_t{device.top}) & 7)];
             std::uint32_t* to = row(y);
             for (std::int32_t x = part.left; x < part.right; ++x) {
