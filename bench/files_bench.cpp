@@ -13,13 +13,16 @@
 #include <memory>
 #include <string>
 
+#include "file.h"
 #include "image.h"
 #include "paired.h"
 
 namespace {
 
 using zqbench::check;
+using zqbench::File;
 using zqbench::Image;
+using zqbench::open;
 
 constexpr int32_t kWidth = 4000;
 constexpr int32_t kHeight = 3000;
@@ -44,14 +47,6 @@ void paint(const Image& image) {
             *pixel++ = 0;
         }
     }
-}
-
-using File = std::unique_ptr<std::FILE, int (*)(std::FILE*)>;
-
-File open(const std::string& path, const char* mode) {
-    File file(std::fopen(path.c_str(), mode), std::fclose);
-    check(file != nullptr, "fopen");
-    return file;
 }
 
 void bare_png_write(const std::string& path, const Image& image) {

@@ -14,6 +14,7 @@
 // After <cstdio>, which it needs.
 #include <jpeglib.h>
 
+#include "file.h"
 #include "image.h"
 #include "paired.h"
 #include "photograph.h"
@@ -21,17 +22,11 @@
 namespace {
 
 using zqbench::check;
+using zqbench::File;
 using zqbench::Image;
+using zqbench::open;
 
 constexpr int32_t kWidth = 4000, kHeight = 3000;
-
-using File = std::unique_ptr<std::FILE, int (*)(std::FILE*)>;
-
-File open(const std::string& path, const char* mode) {
-    File file(std::fopen(path.c_str(), mode), std::fclose);
-    check(file != nullptr, "fopen");
-    return file;
-}
 
 struct Paths {
     std::string ours = name("ours"), bare = name("bare");
