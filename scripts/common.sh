@@ -63,24 +63,28 @@ mingw_deps() {
     touch "$prefix/.complete"
 }
 
-# Makes Wine and its prefix ready and exports what a run under it needs.
+# Makes Wine and its prefixes ready and exports what a run under it needs: one prefix without a
+# display, and a copy of it for windows that are looked at (scripts/with-display.sh).
 wine_setup() {
-    need wine64
+    need wine64 xvfb x11-xkb-utils fonts-liberation
     local version
     version=$(dpkg-query -W -f='${Version}' wine64 | tr -c 'A-Za-z0-9.\n' -)
     export ZQVISSVC_WINE64=/usr/lib/wine/wine64 WINEDEBUG=-all WINEARCH=win64
     export WINEPREFIX=$cache/wine-headless-$version WINESERVER=/usr/lib/wine/wineserver64
+    export ZQVISSVC_WINE_DISPLAY_PREFIX=$cache/wine-display-$version
     export WINEDLLOVERRIDES='mscoree=d;mshtml=d;winemenubuilder.exe=d'
     unset DISPLAY
-    [[ -e $WINEPREFIX/.complete ]] && return
+    [[ -e $WINEPREFIX/.complete && -e $ZQVISSVC_WINE_DISPLAY_PREFIX/.complete ]] && return
     say "preparing Wine, once"
-    rm -rf "$WINEPREFIX"
+    rm -rf "$WINEPREFIX" "$ZQVISSVC_WINE_DISPLAY_PREFIX"
     "$ZQVISSVC_WINE64" wineboot.exe --init </dev/null >/dev/null 2>&1 || die "Wine does not start"
+    "$WINESERVER" -w
+    cp -a "$WINEPREFIX" "$ZQVISSVC_WINE_DISPLAY_PREFIX"
     # Windows that nobody sees, so that message boxes work without a display.
     "$ZQVISSVC_WINE64" reg.exe add 'HKCU\Software\Wine\Drivers' /v Graphics /d null /f \
         </dev/null >/dev/null 2>&1 || die "Wine has no registry"
     "$WINESERVER" -w
-    touch "$WINEPREFIX/.complete"
+    touch "$WINEPREFIX/.complete" "$ZQVISSVC_WINE_DISPLAY_PREFIX/.complete"
 }
 
 # Exports how 32-bit Windows programs are run; makes nothing yet.

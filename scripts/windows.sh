@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
 # ./dev windows: builds both DLLs, checks what they export and import, and packages each with its
-# import library, .def file, headers, the tool and the licences of the parts inside it.
+# import library, .def file, headers, the tool, the viewer and the licences of the parts inside it.
 set -euo pipefail
 . scripts/common.sh
 version=$(project_version)
@@ -8,7 +8,7 @@ version=$(project_version)
 # package BITS ARCH
 package() {
     local name=ZqVisSvc-$version-win$1 stage=$PWD/build/win$1/stage
-    build_preset "win$1" ZqVisSvc zqvis
+    build_preset "win$1" ZqVisSvc zqvis zqview
     scripts/check_exports.sh "build/win$1/bin/ZqVisSvc.dll"
     rm -rf "$stage" "dist/$name.zip"
     mkdir -p dist "$stage/$name"

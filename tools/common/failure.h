@@ -1,7 +1,7 @@
 // How the tool's own code fails: with a code of the library, whose message the library itself
 // gives.
-#ifndef ZQVIS_FAILURE_H
-#define ZQVIS_FAILURE_H
+#ifndef ZQTOOLS_FAILURE_H
+#define ZQTOOLS_FAILURE_H
 
 #include <zqvissvc/types.h>
 

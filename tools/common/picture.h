@@ -1,7 +1,7 @@
 // A picture in the library: an image with its colour table, created, read, converted and written
 // through the exported functions as any host would do it.
-#ifndef ZQVIS_PICTURE_H
-#define ZQVIS_PICTURE_H
+#ifndef ZQTOOLS_PICTURE_H
+#define ZQTOOLS_PICTURE_H
 
 #include <zqvissvc/display.h>
 #include <zqvissvc/files.h>
@@ -68,8 +68,10 @@ class Picture {
     // Row y of the image proper, as stored, without padding. Valid while the picture lives.
     std::span<uint8_t> row(int32_t y) const;
 
-    // Draws the picture on a canvas, in the zoomed and scrolled place of a window.
-    void draw(ZqDeviceContext canvas, int32_t zoom, int32_t x_offset, int32_t y_offset) const;
+    // Draws the picture in the zoomed and scrolled place of a window; dc: null for the window's
+    // own.
+    void draw(ZqWindow window, int32_t zoom, int32_t x_offset, int32_t y_offset,
+              ZqDeviceContext dc = nullptr) const;
 
     // The custom data, by its keys.
     std::vector<std::string> keys() const;

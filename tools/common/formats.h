@@ -1,6 +1,6 @@
 // File types by name and by extension.
-#ifndef ZQVIS_FORMATS_H
-#define ZQVIS_FORMATS_H
+#ifndef ZQTOOLS_FORMATS_H
+#define ZQTOOLS_FORMATS_H
 
 #include <string>
 #include <string_view>

@@ -72,8 +72,9 @@ std::span<uint8_t> Picture::row(int32_t y) const {
             static_cast<size_t>(now.width) * bytes_per_pixel(now.type)};
 }
 
-void Picture::draw(ZqDeviceContext canvas, int32_t zoom, int32_t x_offset, int32_t y_offset) const {
-    check(ZqDrawImage(canvas, value_.image, zoom, x_offset, y_offset, 0, nullptr));
+void Picture::draw(ZqWindow window, int32_t zoom, int32_t x_offset, int32_t y_offset,
+                   ZqDeviceContext dc) const {
+    check(ZqDrawImage(window, value_.image, zoom, x_offset, y_offset, 0, dc));
 }
 
 std::unique_ptr<Picture> Picture::with_colours_applied() const {
