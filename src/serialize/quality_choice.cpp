@@ -7,12 +7,20 @@
 #include <cstring>
 
 #include "serialize/quality_payload.h"
+#include "serialize/quality_seam.h"
 
 namespace zq {
 
 namespace {
 
 constexpr std::int64_t kMostWhole = std::int64_t{1} << 17;
+// Of images up to here single pixels decide which quality is the truest.
+constexpr std::int64_t kMostTouched = std::int64_t{1} << 12;
+
+std::int64_t pixels_of(const Image& image) {
+    return std::int64_t{image.record().width} * image.record().height;
+}
+
 struct SampleShape {
     std::int32_t width, height, strips;
 };
@@ -51,8 +59,9 @@ double squared_distance(const std::uint8_t* a, const std::uint8_t* b) {
 }
 
 double squared_hsl_distance(const std::uint8_t* a, const std::uint8_t* b) {
-    const int hue = std::abs(a[2] - b[2]);
-    return squared_distance<std::uint8_t, 2>(a, b) + square(std::min(hue, 256 - hue));
+    const std::uint8_t hue = a[kHueByte];
+    const std::uint8_t back = crossed_seam(hue, b[kHueByte]) ? own_side(b[kHueByte]) : b[kHueByte];
+    return squared_distance<std::uint8_t, 2>(a, b) + square(hue - back);
 }
 
 using Distance = double (*)(const std::uint8_t*, const std::uint8_t*);
@@ -81,7 +90,7 @@ class Sample {
   public:
     explicit Sample(const Image& image) : image_(image), part_(Variant::kPrivate, {}) {
         const ImageRecord& record = image.record();
-        if (std::int64_t{record.width} * record.height <= kMostWhole) return;
+        if (pixels_of(image) <= kMostWhole) return;
         const SampleShape& shape = is_jpeg_type(image.type()) ? kJpegSample : kWaveletSample;
         const std::int32_t width = std::min(record.width, shape.width);
         const std::int32_t height = std::min(record.height / kBlock * kBlock, shape.height);
@@ -136,24 +145,35 @@ class Sample {
 
 class Trials {
   public:
-    explicit Trials(const Sample& sample) : sample_(sample), result_(Variant::kPrivate, {}) {
+    // `touches` is the quality that pixels are told exactly by.
+    Trials(const Sample& sample, int touches)
+        : sample_(sample), touches_(touches), result_(Variant::kPrivate, {}) {
         const ImageRecord& record = sample.picture().record();
         result_.reinitialise(
             {.type = record.type, .width = record.width, .height = record.height, .border = 0});
     }
 
-    // The total squared error; the best quality so far is kept, of equal ones the first.
+    // The squared error that is left; the best quality so far is kept, of equal ones the first.
     double attempt(int quality) {
         Bytes payload;
         put_payload(payload, sample_.picture(), quality);
         StreamReader reader(payload);
         read_payload(reader, result_, PixelMemory::kUsed);
-        const double total = measure();
+        measure();
+        double total = total_of(errors_);
+        if (is_touched_) {
+            total -= total_of(choose_touches(errors_, result_.type(), touches_));
+        }
         if (best_.quality == 0 || total < margin_ * best_total_) {
             best_total_ = total;
             best_.quality = quality;
             best_.errors.swap(errors_);
-            if (sample_.is_whole()) best_.payload = std::move(payload);
+            if (sample_.is_whole()) {
+                best_.payload = std::move(payload);
+                if (result_.type() == PixelType::kHsl) {
+                    best_.crossed_hues = zq::crossed_hues(sample_.picture(), result_);
+                }
+            }
         }
         return total;
     }
@@ -162,26 +182,25 @@ class Trials {
     QualityChoice take() { return std::move(best_); }
 
   private:
-    double measure() {
+    void measure() {
         const Image& picture = sample_.picture();
         const Distance distance = distance_of(picture.type());
         const std::ptrdiff_t pixel = bytes_per_pixel(picture.type());
         errors_.clear();
-        double total = 0;
         for (std::int32_t y = 0; y < picture.record().height; ++y) {
             const std::uint8_t* from = picture.row(y);
             const std::uint8_t* back = result_.row(y);
             for (std::int32_t x = 0; x < picture.record().width; ++x) {
                 const double squared = distance(from + x * pixel, back + x * pixel);
                 if (squared == 0) continue;
-                total += squared;
                 errors_.push_back({sample_.index_of(x, y), squared});
             }
         }
-        return total;
     }
 
     const Sample& sample_;
+    const int touches_;
+    const bool is_touched_ = pixels_of(sample_.picture()) <= kMostTouched;
     const double margin_ = sample_.is_whole() ? 1 : kSampleMargin;
     Image result_;
     std::vector<PixelError> errors_;
@@ -193,7 +212,7 @@ class Trials {
 
 QualityChoice choose_quality(const Image& image, int quality) {
     const Sample sample(image);
-    Trials trials(sample);
+    Trials trials(sample, quality);
     double above = trials.attempt(quality);
     const bool is_jpeg = is_jpeg_type(image.type());
     // Steps of JPEG divide so that large pictures do not get worse.

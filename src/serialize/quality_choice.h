@@ -9,18 +9,15 @@
 
 #include "image/image.h"
 #include "serialize/quality_stream.h"
+#include "serialize/quality_touches.h"
 
 namespace zq {
 
-struct PixelError {
-    std::uint64_t index;  // y * width + x
-    double squared;       // summed over the samples of the pixel
-};
-
 struct QualityChoice {
-    int quality;                     // the one whose steps are to be used
-    std::optional<Bytes> payload;    // of the whole image, when the trial has made it
-    std::vector<PixelError> errors;  // of some pixels or all, as they will come back
+    int quality;                              // the one whose steps are to be used
+    std::optional<Bytes> payload;             // of the whole image, when the trial has made it
+    std::vector<PixelError> errors;           // of some pixels or all, as they will come back
+    std::vector<std::uint64_t> crossed_hues;  // of the whole payload, where there is one
 };
 
 // `quality`, or a lower one that comes out truer. Images of up to 2^17 pixels are tried as they

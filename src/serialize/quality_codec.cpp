@@ -8,6 +8,7 @@
 
 #include "serialize/quality_choice.h"
 #include "serialize/quality_payload.h"
+#include "serialize/quality_seam.h"
 #include "serialize/quality_stream.h"
 #include "serialize/quality_touches.h"
 
@@ -103,11 +104,29 @@ void rebuild_border(const Image& image) {
     }
 }
 
-// The touches come first, as nothing can fail any more when pixels change.
+// Encodes and decodes once more to find out, for images that were not tried as a whole.
+void put_whole_hsl(Bytes& block, const Image& image, QualityChoice& choice) {
+    if (!choice.payload) {
+        put_payload(choice.payload.emplace(), image, choice.quality);
+        const ImageRecord& record = image.record();
+        Image decoded(Variant::kPrivate, {});
+        decoded.reinitialise(
+            {.type = record.type, .width = record.width, .height = record.height, .border = 0});
+        StreamReader reader(*choice.payload);
+        read_payload(reader, decoded, PixelMemory::kUsed);
+        choice.crossed_hues = crossed_hues(image, decoded);
+    }
+    put_crossed_hues(block, choice.crossed_hues);
+    put_bytes(block, *choice.payload);
+}
+
+// The single pixels come first, as nothing can fail any more when pixels change.
 void put_pixels(Bytes& block, const Image& image, int quality) {
     QualityChoice choice = choose_quality(image, quality);
     put_touches(block, image, choice.errors, quality);
-    if (choice.payload) {
+    if (image.type() == PixelType::kHsl) {
+        put_whole_hsl(block, image, choice);
+    } else if (choice.payload) {
         put_bytes(block, *choice.payload);
     } else {
         put_payload(block, image, choice.quality);
@@ -135,7 +154,10 @@ void decompress_pixels(Image& image, std::span<const std::uint8_t> block, PixelM
         return;
     }
     const auto touches = read_touches(reader, image);
+    const bool is_hsl = image.type() == PixelType::kHsl;
+    const Bytes crossed = is_hsl ? read_crossed_hues(reader, image) : Bytes{};
     read_payload(reader, image, memory);
+    bring_back_hues(crossed, image);
     apply_touches(touches, image);
     rebuild_border(image);
 }

@@ -56,6 +56,16 @@ class StreamReader {
     std::uint32_t u32() { return load_le32(bytes(4).data()); }
     float f32() { return std::bit_cast<float>(u32()); }
     std::span<const std::uint8_t> section() { return bytes(u32()); }
+    // Seven bits a byte, the lowest first; the highest bit says that more come. Below 2^63.
+    std::uint64_t number() {
+        std::uint64_t value = 0;
+        for (int shift = 0; shift < 63; shift += 7) {
+            const std::uint8_t byte = u8();
+            value |= std::uint64_t{byte & 0x7FU} << shift;
+            if (byte < 0x80) return value;
+        }
+        throw kInitializationError;
+    }
     bool at_end() const { return left_.empty(); }
     void expect_end() const {
         if (!left_.empty()) throw kInitializationError;

@@ -5,6 +5,8 @@
 #include <cstring>
 #include <numeric>
 
+#include "serialize/quality_pixel_list.h"
+
 namespace zq {
 
 namespace {
@@ -12,7 +14,7 @@ namespace {
 // Of the squared error, for each quality: 0.0002 dB of a large picture. In small ones that would be
 // less than one pixel, and of small errors less than one unit.
 constexpr double kPart = 5e-5;
-constexpr double kPartOfPixel = 0.5;
+constexpr double kPartOfPixel = 1.001;  // so that equal errors leave no two qualities equal
 constexpr double kUnits = 4;
 constexpr double kMostPart = 0.005;
 
@@ -23,12 +25,6 @@ double part_of(double total, std::size_t pixels, bool is_float) {
 
 std::size_t pixel_bytes(const Image& image) {
     return static_cast<std::size_t>(bytes_per_pixel(image.type()));
-}
-
-std::uint8_t* pixel_at(const Image& image, std::uint64_t index) {
-    const auto width = static_cast<std::uint64_t>(image.record().width);
-    return image.row(static_cast<std::int32_t>(index / width)) +
-           static_cast<std::size_t>(index % width) * pixel_bytes(image);
 }
 
 // Largest first, each that still fits: the errors of the pixels taken add up to `wanted` as nearly
@@ -49,54 +45,37 @@ std::size_t take_up_to(std::span<PixelError> errors, double wanted) {
     return taken;
 }
 
-// Seven bits a byte, the lowest first; the highest bit says that more come.
-void put_number(Bytes& out, std::uint64_t value) {
-    for (; value > 0x7F; value >>= 7) out.push_back(static_cast<std::uint8_t>(value | 0x80));
-    out.push_back(static_cast<std::uint8_t>(value));
-}
-
-std::uint64_t read_number(StreamReader& reader) {
-    std::uint64_t value = 0;
-    for (int shift = 0; shift < 63; shift += 7) {
-        const std::uint8_t byte = reader.u8();
-        value |= std::uint64_t{byte & 0x7FU} << shift;
-        if (byte < 0x80) return value;
-    }
-    throw kInitializationError;
-}
-
 // Calls `visit` with the index and the bytes of each pixel.
 template <class Visit>
 void for_each_touch(std::span<const std::uint8_t> touches, const Image& image, Visit&& visit) {
-    const std::uint64_t pixels = static_cast<std::uint64_t>(image.record().width) *
-                                 static_cast<std::uint64_t>(image.record().height);
-    StreamReader reader(touches);
-    for (std::uint64_t next = 0; !reader.at_end(); ++next) {
-        const std::uint64_t skipped = read_number(reader);
-        if (next >= pixels || skipped >= pixels - next) throw kInitializationError;
-        next += skipped;
-        visit(next, reader.bytes(pixel_bytes(image)));
-    }
+    for_each_listed(touches, image, [&](std::uint64_t index, StreamReader& reader) {
+        visit(index, reader.bytes(pixel_bytes(image)));
+    });
 }
 
 }  // namespace
 
+double total_of(std::span<const PixelError> errors) {
+    return std::accumulate(errors.begin(), errors.end(), 0.0,
+                           [](double sum, const PixelError& e) { return sum + e.squared; });
+}
+
+std::span<PixelError> choose_touches(std::span<PixelError> errors, PixelType type, int quality) {
+    const double total = total_of(errors);
+    if (total <= 0) return {};
+    const bool is_float = type == PixelType::kSgl || type == PixelType::kComplex;
+    const double part = quality * part_of(total, errors.size(), is_float);
+    return part < 1 ? errors.first(take_up_to(errors, part * total)) : errors;
+}
+
 void put_touches(Bytes& out, const Image& image, std::span<PixelError> errors, int quality) {
     const OpenSection section(out);
-    const double total =
-        std::accumulate(errors.begin(), errors.end(), 0.0,
-                        [](double sum, const PixelError& error) { return sum + error.squared; });
-    const bool is_float = image.type() == PixelType::kSgl || image.type() == PixelType::kComplex;
-    if (total > 0) {
-        const double part = quality * part_of(total, errors.size(), is_float);
-        const auto taken = errors.first(take_up_to(errors, part * total));
-        std::ranges::sort(taken, {}, &PixelError::index);
-        std::uint64_t next = 0;
-        for (const PixelError& error : taken) {
-            put_number(out, error.index - next);
-            put_bytes(out, {pixel_at(image, error.index), pixel_bytes(image)});
-            next = error.index + 1;
-        }
+    const auto taken = choose_touches(errors, image.type(), quality);
+    std::ranges::sort(taken, {}, &PixelError::index);
+    PixelListWriter list(out);
+    for (const PixelError& error : taken) {
+        list.put(error.index);
+        put_bytes(out, {pixel_at(image, error.index), pixel_bytes(image)});
     }
     section.close();
 }

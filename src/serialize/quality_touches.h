@@ -2,13 +2,22 @@
 // is still truer.
 #pragma once
 
+#include <cstdint>
 #include <span>
 
 #include "image/image.h"
-#include "serialize/quality_choice.h"
 #include "serialize/quality_stream.h"
 
 namespace zq {
+
+struct PixelError {
+    std::uint64_t index;  // y * width + x
+    double squared;       // summed over the samples of the pixel
+};
+double total_of(std::span<const PixelError> errors);
+
+// The pixels that a quality tells exactly; they are moved to the front of `errors`.
+std::span<PixelError> choose_touches(std::span<PixelError> errors, PixelType type, int quality);
 
 // Writes a section of pixels that take a part of the squared error away. The part grows with the
 // quality (1 to 100). `errors` is used up.
