@@ -60,7 +60,8 @@ ZQ_API uint32_t ZQ_CALL Gen_PlotZoomedImage(ZqWindow window, const void* pixels,
  * without one smallest to largest sample; floats smallest to largest; complex pixels the spectrum.
  * image    null: the background alone.
  * bottomUp not 0: upside down.
- * Also returns ZQ_ERR_NOT_AN_IMAGE and ZQ_ERR_NOT_ENOUGH_MEMORY. */
+ * Also returns ZQ_ERR_NOT_AN_IMAGE and ZQ_ERR_NOT_ENOUGH_MEMORY; 0 and draws nothing for an image
+ * that another thread disposes while the call waits for its lock. */
 ZQ_API ZqError ZQ_CALL ZqDrawImage(ZqWindow window, ZqImageHandle image, int32_t zoom,
                                    int32_t xOffset, int32_t yOffset, int32_t bottomUp,
                                    ZqDeviceContext dc);
@@ -78,7 +79,9 @@ ZQ_API uint32_t ZQ_CALL Gen_GetImageClientPos(ZqWindow window, int32_t x, int32_
  * excluded    not painted; null: none. Afterwards it belongs to the clip region.
  * colour, backgroundColour  0x00BBGGRR.
  * brushStyle  0 plain; 1 none; 2 hatched with `hatch` (0 to 5); 3 and 5 to 8 the button-face
- * pattern. Returns the last system call's result, 0 without a device context or rectangle. */
+ * pattern.
+ * Returns the last system call's result: 0 without a device context or rectangle, and for a brush
+ * that cannot be made when nothing is excluded; else 1. */
 ZQ_API int32_t ZQ_CALL DrawImageBackground2(ZqDeviceContext dc, const ZqCoordinates* rectangle,
                                             const ZqCoordinates* excluded, uint32_t colour,
                                             uint32_t backgroundColour, int32_t brushStyle,

@@ -7,12 +7,15 @@ namespace {
 constexpr Pattern kPattern = {0x00, 0x00, 0xCC, 0xCC, 0x00, 0x00, 0xCC, 0xCC};
 constexpr std::uint32_t kWhite = 0xFFFFFF;
 
-std::optional<Brush> make_brush(const BackgroundBrush& wanted, std::uint32_t button_face) {
+Brush make_brush(const BackgroundBrush& wanted, std::uint32_t button_face) {
     Brush brush{.colour = wanted.colour,
                 .text_colour = wanted.colour,
                 .background_colour = wanted.background_colour};
     switch (wanted.style) {
         case 0:
+            return brush;
+        case 1:
+            brush.kind = Brush::Kind::kNone;
             return brush;
         case 2:
             brush.kind = Brush::Kind::kHatch;
@@ -29,23 +32,22 @@ std::optional<Brush> make_brush(const BackgroundBrush& wanted, std::uint32_t but
             brush.background_colour = kWhite;
             return brush;
         default:
-            return std::nullopt;
+            brush.kind = Brush::Kind::kUnknown;
+            return brush;
     }
 }
 
 }  // namespace
 
-std::int32_t paint_background(DeviceContext& dc, const Box& box, const std::optional<Box>& excluded,
-                              const BackgroundBrush& wanted) {
+bool paint_background(DeviceContext& dc, const Box& box, const std::optional<Box>& excluded,
+                      const BackgroundBrush& wanted) {
     const Box device = dc.to_device(box);
     const Box hole = excluded ? dc.to_device(*excluded) : Box{0, 0, 0, 0};
     if (excluded) dc.exclude_clip(hole);
     dc.set_mapping({});
-    const std::optional<Brush> brush = make_brush(wanted, dc.button_face());
-    std::int32_t result = wanted.style == 1 ? 1 : 0;
-    if (brush) result = dc.fill(device, *brush);
+    const bool filled = dc.fill(device, make_brush(wanted, dc.button_face()));
     if (excluded) dc.include_clip(hole);
-    return result;
+    return filled || excluded.has_value();
 }
 
 void paint_display_background(DeviceContext& dc, const Box& box,

@@ -15,9 +15,10 @@ struct BackgroundBrush {
 };
 
 // Fills a box of logical units but for the excluded one, which is added to the clip region
-// afterwards. Leaves the mapping one-to-one. Returns the system's result; 0 for an unknown style.
-std::int32_t paint_background(DeviceContext& dc, const Box& box, const std::optional<Box>& excluded,
-                              const BackgroundBrush& brush);
+// afterwards. Leaves the mapping one-to-one. Returns whether the last that was made, the brush or
+// the region of the excluded box, could be given back.
+bool paint_background(DeviceContext& dc, const Box& box, const std::optional<Box>& excluded,
+                      const BackgroundBrush& brush);
 
 // The same with the pattern of image displays.
 void paint_display_background(DeviceContext& dc, const Box& box,

@@ -34,7 +34,7 @@ class Canvas final : public DeviceContext {
     void include_clip(const Box& device) override;
     void set_stretching() override {}  // there is no other way
     void stretch(const Dib& dib, const Box& source, const Box& destination) override;
-    std::int32_t fill(const Box& device, const Brush& brush) override;
+    bool fill(const Box& device, const Brush& brush) override;
     std::uint32_t button_face() override { return 0xF0F0F0; }
 
   private:

@@ -99,7 +99,9 @@ void Canvas::stretch(const Dib& dib, const Box& source, const Box& destination) 
     }
 }
 
-std::int32_t Canvas::fill(const Box& device, const Brush& brush) {
+bool Canvas::fill(const Box& device, const Brush& brush) {
+    if (brush.kind == Brush::Kind::kNone) return true;
+    if (brush.kind == Brush::Kind::kUnknown) return false;
     const Box area = filled_area(device);
     std::uint32_t set = pixel_of_colour(brush.background_colour);
     std::uint32_t unset = pixel_of_colour(brush.text_colour);
@@ -107,7 +109,7 @@ std::int32_t Canvas::fill(const Box& device, const Brush& brush) {
     if (brush.kind != Brush::Kind::kPattern) unset = pixel_of_colour(brush.colour);
     if (brush.kind == Brush::Kind::kPlain) pattern = {};
     if (brush.kind == Brush::Kind::kHatch) {
-        if (brush.hatch < 0 || brush.hatch >= kHatchLimit) return 0;
+        if (brush.hatch < 0 || brush.hatch >= kHatchLimit) return false;
         const auto hatch = static_cast<std::size_t>(brush.hatch);
         pattern = hatch < kHatches.size() ? kHatches[hatch] : Pattern{};
     }
@@ -123,7 +125,7 @@ std::int32_t Canvas::fill(const Box& device, const Brush& brush) {
             }
         }
     }
-    return 1;
+    return true;
 }
 
 }  // namespace zq

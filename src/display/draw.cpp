@@ -27,15 +27,17 @@ bool lies_inside(const Box& source, const PixelView& view) {
            source.bottom <= view.height && !source.empty();
 }
 
-// Every tile is a top-down bitmap of its own, as high as its band.
+// Every tile is a bitmap of its own, as high as its band; seen upside down, the last rows are the
+// first band.
 void stretch_tiles(DeviceContext& dc, const Dib& dib, const Box& source, const Box& destination) {
     for (std::int32_t y = source.top, height = 0; y < source.bottom; y += height) {
         height = std::min(kTile, source.bottom - y);
+        const std::int32_t above = y - source.top;
+        const std::int32_t first = dib.bottom_up ? source.bottom - above - height : y;
         Dib band = dib;
-        band.bits += static_cast<std::size_t>(y) * dib.stride();
+        band.bits += static_cast<std::size_t>(first) * dib.stride();
         band.height = height;
-        band.bottom_up = false;
-        const std::int32_t to_y = destination.top + (y - source.top);
+        const std::int32_t to_y = destination.top + above;
         for (std::int32_t x = source.left, width = 0; x < source.right; x += width) {
             width = std::min(kTile, source.right - x);
             const std::int32_t to_x = destination.left + (x - source.left);
@@ -145,15 +147,11 @@ void draw_zoomed(DeviceContext& dc, const std::optional<PixelView>& view, const 
     mapping.viewport_origin = {
         origin_on_axis(scaled(view->width, extents), place.client.width(), place.offset.x),
         origin_on_axis(scaled(view->height, extents), place.client.height(), place.offset.y)};
-    // Device pixels: at a zoom, logical units would leave gaps at the edges.
-    dc.set_mapping({});
-    const Box clip = dc.clip_box();
     dc.set_mapping(mapping);
     const Box whole{0, 0, view->width, view->height};
-    const Box covered = dc.to_device(whole);
-    if (intersect(clip, covered) != clip) {
-        dc.set_mapping({});
-        paint_display_background(dc, clip, covered);
+    const Box clip = dc.clip_box();
+    if (!clip.empty() && intersect(clip, whole) != clip) {
+        paint_display_background(dc, clip, whole);
         dc.set_mapping(mapping);
     }
     draw(dc, *view, whole, whole, options);

@@ -9,6 +9,7 @@
 #include "display/draw.h"
 #include "host/boundary.h"
 #include "image/image_lock.h"
+#include "image/lifecycle.h"
 #include "platform/drawing.h"
 
 using namespace zq;
@@ -86,6 +87,20 @@ void draw_silently(const Drawing& drawing) {
     } catch (GRLIBError_enum) {
     } catch (const std::bad_alloc&) {
     }
+}
+
+// Ends silently for an image that is disposed while the draw waits for it.
+void draw_image(DeviceContext& dc, ImageHandle image, const ZoomedPlace& place,
+                const DrawOptions& options) {
+    std::optional<LockedImage> locked;
+    try {
+        locked.emplace(image);
+    } catch (GRLIBError_enum) {
+        return;
+    }
+    std::optional<PixelView> view = PixelView::of(**locked);
+    if (view->pixels == nullptr || view->width < 1 || view->height < 1) view.reset();
+    draw_zoomed(dc, view, place, options);
 }
 
 struct Plot {
@@ -169,10 +184,8 @@ ZqError ZQ_CALL ZqDrawImage(ZqWindow window, ZqImageHandle image, int32_t zoom, 
         DeviceContext& context = target.require();
         const ZoomedPlace place = place_in(window, zoom, {xOffset, yOffset});
         if (image == nullptr) return draw_zoomed(context, std::nullopt, place, {});
-        const LockedImage locked(image);
-        std::optional<PixelView> view = PixelView::of(*locked);
-        if (view->pixels == nullptr || view->width < 1 || view->height < 1) view.reset();
-        draw_zoomed(context, view, place, options_for(bottomUp != 0));
+        if (!is_live_image(image)) throw kNotAnImage;
+        draw_image(context, image, place, options_for(bottomUp != 0));
     });
 }
 
@@ -202,8 +215,9 @@ int32_t ZQ_CALL DrawImageBackground2(ZqDeviceContext dc, const ZqCoordinates* re
         if (target.get() == nullptr || rectangle == nullptr) return;
         std::optional<Box> hole;
         if (excluded != nullptr) hole = to_box(*excluded);
-        result = paint_background(target.require(), to_box(*rectangle), hole,
-                                  {colour, backgroundColour, brushStyle, hatch});
+        const bool done = paint_background(target.require(), to_box(*rectangle), hole,
+                                           {colour, backgroundColour, brushStyle, hatch});
+        result = done ? 1 : 0;
     });
     return code == 0 ? result : 0;
 }

@@ -12,6 +12,7 @@ Box intersect(const Box& a, const Box& b) {
 }
 
 Box covering(DeviceContext& dc, const Box& device) {
+    if (device.empty()) return {0, 0, 0, 0};
     const Box logical = dc.to_logical(device);
     const Box again = dc.to_device(logical);
     return {logical.left - (again.left > device.left ? 1 : 0),

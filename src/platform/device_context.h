@@ -58,7 +58,8 @@ struct Dib {
 using Pattern = std::array<std::uint8_t, 8>;  // rows from the top, the highest bit leftmost
 
 struct Brush {
-    enum class Kind { kPlain, kHatch, kPattern };
+    // kNone paints nothing; kUnknown cannot be made.
+    enum class Kind { kPlain, kNone, kHatch, kPattern, kUnknown };
     Kind kind = Kind::kPlain;
     std::int32_t hatch = 0;
     Pattern pattern{};         // a bit that is set has the background colour
@@ -85,12 +86,12 @@ class DeviceContext {
     // Draws the source box of the bitmap, which lies inside, into a box of logical units. Of a
     // bottom-up bitmap the box counts rows as memory does.
     virtual void stretch(const Dib& dib, const Box& source, const Box& destination) = 0;
-    // Device pixels, brush origin at the box's corner; returns the system's result.
-    virtual std::int32_t fill(const Box& device, const Brush& brush) = 0;
+    // Device pixels, brush origin at the box's corner; returns whether the brush could be made.
+    virtual bool fill(const Box& device, const Brush& brush) = 0;
     virtual std::uint32_t button_face() = 0;  // 0x00BBGGRR
 };
 
-// The smallest box of logical units around one of device pixels.
+// The smallest box of logical units around one of device pixels; (0, 0) to (0, 0) for an empty one.
 Box covering(DeviceContext& dc, const Box& device);
 
 }  // namespace zq

@@ -28,7 +28,7 @@ IntervalClock::IntervalClock(const TickSource& source)
     frequency_ = *frequency;
 }
 
-IntervalClock* IntervalClock::of_process() {
+IntervalClock* IntervalClock::of_process() noexcept {
     struct Holder {
         std::optional<IntervalClock> clock;
         Holder() {
@@ -44,6 +44,11 @@ IntervalClock* IntervalClock::of_process() {
     static Holder holder;
     return holder.clock ? &*holder.clock : nullptr;
 }
+
+namespace {
+// Before any caller can come.
+[[maybe_unused]] const IntervalClock* const made_with_the_library = IntervalClock::of_process();
+}  // namespace
 
 double IntervalClock::elapsed_microseconds() const {
     const std::int64_t ticks = difference(start_.load(std::memory_order_relaxed), now());

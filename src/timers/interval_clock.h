@@ -21,8 +21,8 @@ class IntervalClock {
     // Throws kInitializationError when the performance counter vanishes while the clock is made.
     explicit IntervalClock(const TickSource& source);
 
-    // The process's one clock, made on first use; null when it could not be made.
-    static IntervalClock* of_process();
+    // The process's one clock, made with the library; null when it could not be made.
+    static IntervalClock* of_process() noexcept;
 
     std::int64_t now() const {
         return counts_milliseconds_ ? source_.milliseconds() : source_.ticks();

@@ -88,10 +88,11 @@ TEST(Display, RefusesInOrderAndDrawsNothingForImpossibleRectangles) {
 TEST(Display, ZoomsOverThePattern) {
     TestCanvas canvas(8, 6);
     EXPECT_EQ(Gen_PlotZoomedImage(canvas.handle, kGrey, 2, 3, 2, 0, 0, 0, nullptr), 0U);
-    // Text colour is the button face, the pattern's set bits are white.
+    // Text colour is the button face, the pattern's set bits are white. It starts at the first
+    // logical pixel that shows in part: outside, as the image starts at (1, 1).
     EXPECT_EQ(canvas.row(0), (Row{240, 240, 240, 240, 240, 240, 240, 240}));
-    EXPECT_EQ(canvas.row(1), (Row{240, 1, 1, 2, 2, 3, 3, 240}));
-    EXPECT_EQ(canvas.row(2), (Row{255, 1, 1, 2, 2, 3, 3, 240}));
+    EXPECT_EQ(canvas.row(1), (Row{255, 1, 1, 2, 2, 3, 3, 255}));
+    EXPECT_EQ(canvas.row(2), (Row{255, 1, 1, 2, 2, 3, 3, 255}));
     EXPECT_EQ(canvas.row(4), (Row{240, 4, 4, 5, 5, 6, 6, 240}));
     ZqCoordinates place = {};
     EXPECT_EQ(Gen_GetImageClientPos(canvas.handle, 6, 4, 1, 1, &place), 0U);
@@ -107,7 +108,7 @@ TEST(Display, ClippedDrawsShowWhatWholeOnesShowThere) {
     // In place as bytes, mapped as samples.
     std::vector<uint16_t> pixels(20 * 20);
     for (size_t i = 0; i < pixels.size(); ++i) pixels[i] = static_cast<uint16_t>(4 + i % 200 * 5);
-    const ZqCoordinates clips[] = {{3, 5, 11, 9}, {0, 19, 20, 20}, {7, 0, 8, 20}};
+    const ZqCoordinates clips[] = {{3, 5, 11, 9}, {0, 19, 20, 20}, {7, 0, 8, 20}, {9, 9, 9, 9}};
     for (const int32_t zoom : {1, 2, 7, 16, -2, -3}) {
         for (const int32_t offset : {0, 1, 7, 9}) {
             for (const uint32_t flags : {0U, 1U, 8U, 9U}) {
@@ -121,6 +122,9 @@ TEST(Display, ClippedDrawsShowWhatWholeOnesShowThere) {
                     const TestCanvas part(20, 20);
                     ZqSetCanvasClip(part.handle, &clip);
                     draw(part);
+                    if (clip.top == clip.bottom) {
+                        EXPECT_EQ(part.row(9), Row(20)) << "nothing";
+                    }
                     for (int32_t y = clip.top; y < clip.bottom; ++y) {
                         const Row expected = whole.row(y), actual = part.row(y);
                         const auto inside = [&](const Row& row) {
@@ -152,9 +156,13 @@ TEST(Display, PaintsEveryBrushButTheExcludedRectangle) {
     for (const int32_t style : {0, 1, 2, 3, 4, 5, 6, 7, 8, 9}) {
         TestCanvas canvas(4, 4);
         const ZqCoordinates whole = {0, 0, 4, 4}, hole = {1, 0, 3, 4};
-        const int32_t result =
-            DrawImageBackground2(canvas.handle, &whole, &hole, 0x0A0B0C, 0x0D0E0F, style, 1);
-        EXPECT_EQ(result != 0, style != 4 && style != 9) << style;
+        const auto paint = [&](const ZqCoordinates* area, const ZqCoordinates* excluded) {
+            return DrawImageBackground2(canvas.handle, area, excluded, 0x0A0B0C, 0x0D0E0F, style,
+                                        1);
+        };
+        const ZqCoordinates nothing = {0, 0, 0, 0};
+        EXPECT_EQ(paint(&nothing, nullptr), style != 4 && style != 9 ? 1 : 0) << style;
+        EXPECT_EQ(paint(&whole, &hole), 1) << "the region is given back last, " << style;
         const bool pattern = style == 3 || (style >= 5 && style <= 8);
         const int edge = pattern ? 240 : style == 0 ? 0x0A : style == 2 ? 0x0D : 0;
         EXPECT_EQ(canvas.row(0), (Row{edge, 0, 0, edge})) << style;

@@ -29,7 +29,7 @@ class Recorder final : public DeviceContext {
     void stretch(const Dib& dib, const Box& source, const Box& destination) override {
         blits.push_back({source, destination, dib.height, dib.bits - base});
     }
-    std::int32_t fill(const Box& /*device*/, const Brush& /*brush*/) override { return ++fills; }
+    bool fill(const Box& /*device*/, const Brush& /*brush*/) override { return ++fills > 0; }
     std::uint32_t button_face() override { return 0; }
 
     Box clip{-10000, -10000, 10000, 10000};
@@ -86,6 +86,14 @@ TEST(Draw, OnlyWhatIsVisibleAtTheSamePlaceAndInTilesWithoutLargeBitmaps) {
         {{0, 0, 1024, 476}, {7, 1032, 1031, 1508}, 476, 1024 * 2000},
         {{1024, 0, 2000, 476}, {1031, 1032, 2007, 1508}, 476, 1024 * 2000}};
     EXPECT_EQ(dc.blits, tiles);
+
+    dc.blits.clear();
+    draw(dc, view, {0, 0, 1000, 1500}, {7, 8, 1007, 1508},
+         {.bottom_up = true, .large_bitmaps = false});
+    const std::vector<Recorder::Blit> upside_down = {
+        {{0, 0, 1000, 1024}, {7, 8, 1007, 1032}, 1024, 476 * 2000},
+        {{0, 0, 1000, 476}, {7, 1032, 1007, 1508}, 476, 0}};
+    EXPECT_EQ(dc.blits, upside_down);
 }
 
 TEST(Draw, PlacesZoomedImages) {

@@ -38,6 +38,15 @@ Point point_of(LONG x, LONG y) {
     return {static_cast<std::int32_t>(x), static_cast<std::int32_t>(y)};
 }
 
+bool is_nt() {
+    OSVERSIONINFOA version{};
+    version.dwOSVersionInfoSize = sizeof(version);
+    return GetVersionExA(&version) != 0 && version.dwPlatformId == VER_PLATFORM_WIN32_NT;
+}
+
+// Asked once, when the library is loaded.
+const bool kIsNt = is_nt();
+
 class GdiContext final : public DeviceContext {
   public:
     GdiContext(HDC dc, HWND owner) : dc_(dc), owner_(owner) {}
@@ -103,7 +112,7 @@ class GdiContext final : public DeviceContext {
                       static_cast<int>(source.width()), rows.height, rows.bits,
                       reinterpret_cast<const BITMAPINFO*>(&header), DIB_RGB_COLORS, SRCCOPY);
     }
-    std::int32_t fill(const Box& device, const Brush& brush) override;
+    bool fill(const Box& device, const Brush& brush) override;
     std::uint32_t button_face() override { return GetSysColor(COLOR_BTNFACE); }
 
   private:
@@ -125,10 +134,14 @@ class GdiContext final : public DeviceContext {
     HWND owner_;  // null: the context is the caller's
 };
 
-std::int32_t GdiContext::fill(const Box& device, const Brush& brush) {
+bool GdiContext::fill(const Box& device, const Brush& brush) {
     LOGBRUSH description{BS_SOLID, brush.colour, 0};
     HBITMAP bitmap = nullptr;
-    if (brush.kind == Brush::Kind::kHatch) {
+    if (brush.kind == Brush::Kind::kNone) {
+        description.lbStyle = BS_NULL;
+    } else if (brush.kind == Brush::Kind::kUnknown) {
+        description.lbStyle = BS_INDEXED;  // which no system makes
+    } else if (brush.kind == Brush::Kind::kHatch) {
         description = {BS_HATCHED, brush.colour, static_cast<ULONG_PTR>(brush.hatch)};
     } else if (brush.kind == Brush::Kind::kPattern) {
         WORD rows[8];  // two bytes a row
@@ -139,15 +152,14 @@ std::int32_t GdiContext::fill(const Box& device, const Brush& brush) {
     SetTextColor(dc_, brush.text_colour);
     SetBkColor(dc_, brush.background_colour);
     HBRUSH made = CreateBrushIndirect(&description);
-    std::int32_t result = 0;
+    SetBrushOrgEx(dc_, device.left, device.top, nullptr);
     if (made != nullptr) {
-        SetBrushOrgEx(dc_, device.left, device.top, nullptr);
         const RECT rect = rect_of(device);
-        result = FillRect(dc_, &rect, made);
+        FillRect(dc_, &rect, made);
         DeleteObject(made);
     }
     if (bitmap != nullptr) DeleteObject(bitmap);
-    return result;
+    return made != nullptr;
 }
 
 }  // namespace
@@ -172,9 +184,7 @@ Box client_box(void* window) {
 }
 
 bool can_display_large_bitmaps() {
-    OSVERSIONINFOA version{};
-    version.dwOSVersionInfoSize = sizeof(version);
-    return GetVersionExA(&version) != 0 && version.dwPlatformId == VER_PLATFORM_WIN32_NT;
+    return kIsNt;
 }
 
 }  // namespace zq::platform
