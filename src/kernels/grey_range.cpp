@@ -17,32 +17,50 @@
 HWY_BEFORE_NAMESPACE();
 namespace zq::HWY_NAMESPACE {
 
-// Comparisons with NaN are false, so that it changes nothing. Two of each, as one waits for the
-// one before it.
+// The lesser and the greater; of a NaN and `known`, `known`, as the instructions of x86 do.
+template <class V>
+HWY_INLINE V lesser(V value, V known) {
+#if HWY_ARCH_X86
+    return hn::Min(value, known);
+#else
+    return hn::IfThenElse(hn::Lt(value, known), value, known);
+#endif
+}
+
+template <class V>
+HWY_INLINE V greater(V value, V known) {
+#if HWY_ARCH_X86
+    return hn::Max(value, known);
+#else
+    return hn::IfThenElse(hn::Gt(value, known), value, known);
+#endif
+}
+
+// Four of each, as one waits for the one before it.
 template <class T, class Range>
 HWY_INLINE void widen(const T* HWY_RESTRICT from, std::size_t pixels, Range& range) {
     const hn::ScalableTag<T> tag;
     const std::size_t lanes = hn::Lanes(tag);
-    auto least = hn::Set(tag, static_cast<T>(range.least)), other_least = least;
-    auto largest = hn::Set(tag, static_cast<T>(range.largest)), other_largest = largest;
+    auto low0 = hn::Set(tag, static_cast<T>(range.least)), low1 = low0, low2 = low0, low3 = low0;
+    auto high0 = hn::Set(tag, static_cast<T>(range.largest)), high1 = high0, high2 = high0,
+         high3 = high0;
     const auto take = [&](auto& low, auto& high, const T* at) HWY_ATTR {
         const auto value = hn::LoadU(tag, at);
-        if constexpr (std::is_integral_v<T>) {
-            low = hn::Min(value, low);
-            high = hn::Max(value, high);
-        } else {
-            low = hn::IfThenElse(hn::Lt(value, low), value, low);
-            high = hn::IfThenElse(hn::Gt(value, high), value, high);
-        }
+        low = lesser(value, low);
+        high = greater(value, high);
     };
     std::size_t done = 0;
-    for (; done + 2 * lanes <= pixels; done += 2 * lanes) {
-        take(least, largest, from + done);
-        take(other_least, other_largest, from + done + lanes);
+    for (; done + 4 * lanes <= pixels; done += 4 * lanes) {
+        take(low0, high0, from + done);
+        take(low1, high1, from + done + lanes);
+        take(low2, high2, from + done + 2 * lanes);
+        take(low3, high3, from + done + 3 * lanes);
     }
-    for (; done + lanes <= pixels; done += lanes) take(least, largest, from + done);
-    range.least = hn::GetLane(hn::MinOfLanes(tag, hn::Min(least, other_least)));
-    range.largest = hn::GetLane(hn::MaxOfLanes(tag, hn::Max(largest, other_largest)));
+    for (; done + lanes <= pixels; done += lanes) take(low0, high0, from + done);
+    const auto low = hn::Min(hn::Min(low0, low1), hn::Min(low2, low3));
+    const auto high = hn::Max(hn::Max(high0, high1), hn::Max(high2, high3));
+    range.least = hn::GetLane(hn::MinOfLanes(tag, low));
+    range.largest = hn::GetLane(hn::MaxOfLanes(tag, high));
     scalar::widen_range(from + done, pixels - done, range);
 }
 
@@ -112,28 +130,26 @@ void i16_to_u8_in_range(const std::int16_t* from, std::uint8_t* to, std::size_t 
     map_any_range(from, to, pixels, range.least, span);
 }
 
-// divide(numerator) makes quotients.
+// divide(numerator) makes quotients. NaN and what is too large become 0; all others are below 256,
+// and so are the lowest bits of their sums with 2^23.
 template <class Divide>
 HWY_INLINE void map_floats(const float* from, std::uint8_t* to, std::size_t pixels, float least,
                            const Divide& divide) {
     const hn::ScalableTag<float> tag;
-    const hn::RebindToSigned<decltype(tag)> words;
     const hn::Rebind<std::uint8_t, decltype(tag)> bytes;
     const hn::RebindToUnsigned<decltype(tag)> bits;
     const auto low = hn::Set(tag, least);
-    const auto limit = hn::Set(tag, 2147483648.0F);
     map_row(tag, bytes, from, to, pixels, [&](auto value) HWY_ATTR {
         const auto quotient = divide(hn::Mul(hn::Sub(value, low), hn::Set(tag, 255.0F)));
-        const auto fits = hn::Lt(hn::Abs(quotient), limit);
-        const auto word = hn::ConvertTo(words, hn::IfThenElseZero(fits, quotient));
-        return hn::TruncateTo(bytes, hn::BitCast(bits, word));
+        const auto whole = hn::Trunc(greater(quotient, hn::Zero(tag)));
+        return hn::TruncateTo(bytes, hn::BitCast(bits, hn::Add(whole, hn::Set(tag, 0x1p23F))));
     });
 }
 
 // Where products and sums are rounded once, two corrections of a product with the rounded
 // reciprocal give the rounded quotient: the first is within a unit in the last place, and from such
-// the second is exact (P. Markstein, 1990). Nothing below 1 matters, and what overflows becomes NaN
-// and so 0, as the quotient does; but the divisor and its reciprocal must be far from both ends.
+// the second is exact (P. Markstein, 1990). Nothing below 1 matters, but the divisor and its
+// reciprocal must be far from both ends.
 void f32_to_u8_in_range(const float* from, std::uint8_t* to, std::size_t pixels, FloatRange range) {
     const hn::ScalableTag<float> tag;
     const float span = range.largest - range.least;

@@ -29,8 +29,8 @@ void widen_range(const float* from, std::size_t pixels, FloatRange& range);
 void i16_to_u8_in_range(const std::int16_t* from, std::uint8_t* to, std::size_t pixels,
                         SampleRange range);
 
-// (value - least) * 255 / (largest - least) in single precision, cut towards zero, and of that the
-// low byte; 0 where the quotient is no 32-bit number (a range of one value, NaN, overflow).
+// (value - least) * 255 / (largest - least) in single precision, cut towards zero, of values within
+// the range; 0 where the quotient is no number below 256 (a range of one value, NaN, overflow).
 void f32_to_u8_in_range(const float* from, std::uint8_t* to, std::size_t pixels, FloatRange range);
 
 }  // namespace zq

@@ -20,10 +20,8 @@ inline std::uint8_t in_range(std::int16_t sample, SampleRange range) {
 }
 
 inline std::uint8_t in_range(float value, FloatRange range) {
-    constexpr float kLimit = 2147483648.0F;
     const float quotient = (value - range.least) * 255.0F / (range.largest - range.least);
-    if (!(quotient >= -kLimit && quotient < kLimit)) return 0;
-    return static_cast<std::uint8_t>(static_cast<std::int32_t>(quotient));
+    return quotient < 256 ? static_cast<std::uint8_t>(quotient) : std::uint8_t{0};
 }
 
 }  // namespace zq::scalar

@@ -60,10 +60,18 @@ TEST(GreyRange, FloatsOfEveryKind) {
             const int count = zqtest::kThorough ? 300'000 : 3000;
             for (int i = 0; i < count; ++i) {
                 values.push_back(std::bit_cast<float>(static_cast<std::uint32_t>(random())));
+                // Just below and at each byte's first value.
+                const float step =
+                    static_cast<float>(i % 256) * (range.largest / 255 - range.least / 255) +
+                    range.least;
+                values.push_back(std::nextafter(step, -inf));
+                values.push_back(step);
                 values.push_back(static_cast<float>(i) * (range.largest - range.least) /
                                      static_cast<float>(count) +
                                  range.least);
             }
+            std::erase_if(
+                values, [&](float value) { return value < range.least || value > range.largest; });
             compare(values, range, f32_to_u8_in_range);
         }
     });
