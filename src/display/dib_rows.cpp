@@ -34,14 +34,11 @@ void fill_rows(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>&
     }
 }
 
-// From the last row up, so that the first rows, which are mapped next, are still in the cache.
 template <class Sample, class Range>
 Range range_of(const PixelView& view) {
     Range range;
-    for (std::int32_t y = view.height - 1; y >= 0; --y) {
-        widen_range(reinterpret_cast<const Sample*>(view.row(y)),
-                    static_cast<std::size_t>(view.width), range);
-    }
+    widen_range(reinterpret_cast<const Sample*>(view.pixels), static_cast<std::size_t>(view.width),
+                static_cast<std::size_t>(view.height), view.line_width, range);
     return range;
 }
 
@@ -91,9 +88,10 @@ void show(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>& scra
         case PixelType::kI16:
             return show_samples(view, dib, scratch);
         case PixelType::kSgl: {
-            const auto range = range_of<float, FloatRange>(view);
+            const FloatScale scale = scale_of(range_of<float, FloatRange>(view),
+                                              width * static_cast<std::size_t>(dib.height));
             return fill_rows(view, dib, scratch, [&](const std::uint8_t* from, std::uint8_t* to) {
-                f32_to_u8_in_range(reinterpret_cast<const float*>(from), to, width, range);
+                f32_to_u8_scaled(reinterpret_cast<const float*>(from), to, width, scale);
             });
         }
         case PixelType::kComplex:

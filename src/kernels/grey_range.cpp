@@ -8,8 +8,8 @@
 #include <hwy/highway.h>
 
 #include <algorithm>
+#include <bit>
 #include <cmath>
-#include <type_traits>
 
 #include "kernels/grey_range_scalar.h"
 #include "kernels/row_loop-inl.h"
@@ -36,9 +36,11 @@ HWY_INLINE V greater(V value, V known) {
 #endif
 }
 
-// Four of each, as one waits for the one before it.
+// Four of each, as one waits for the one before it. The first and the last vector of a row overlap
+// others, which lie within cache lines.
 template <class T, class Range>
-HWY_INLINE void widen(const T* HWY_RESTRICT from, std::size_t pixels, Range& range) {
+HWY_INLINE void widen(const T* first, std::size_t pixels, std::size_t rows, std::ptrdiff_t stride,
+                      Range& range) {
     const hn::ScalableTag<T> tag;
     const std::size_t lanes = hn::Lanes(tag);
     auto low0 = hn::Set(tag, static_cast<T>(range.least)), low1 = low0, low2 = low0, low3 = low0;
@@ -49,27 +51,43 @@ HWY_INLINE void widen(const T* HWY_RESTRICT from, std::size_t pixels, Range& ran
         low = lesser(value, low);
         high = greater(value, high);
     };
-    std::size_t done = 0;
-    for (; done + 4 * lanes <= pixels; done += 4 * lanes) {
-        take(low0, high0, from + done);
-        take(low1, high1, from + done + lanes);
-        take(low2, high2, from + done + 2 * lanes);
-        take(low3, high3, from + done + 3 * lanes);
+    for (std::size_t row = rows; row-- > 0;) {
+        const T* from = first + static_cast<std::ptrdiff_t>(row) * stride;
+        take(low2, high2, from);
+        std::size_t done = (0 - reinterpret_cast<std::uintptr_t>(from)) / sizeof(T) % lanes;
+        for (; done + 4 * lanes <= pixels; done += 4 * lanes) {
+            take(low0, high0, from + done);
+            take(low1, high1, from + done + lanes);
+            take(low2, high2, from + done + 2 * lanes);
+            take(low3, high3, from + done + 3 * lanes);
+        }
+        for (; done + lanes <= pixels; done += lanes) take(low0, high0, from + done);
+        if (done < pixels) take(low1, high1, from + pixels - lanes);
     }
-    for (; done + lanes <= pixels; done += lanes) take(low0, high0, from + done);
     const auto low = hn::Min(hn::Min(low0, low1), hn::Min(low2, low3));
     const auto high = hn::Max(hn::Max(high0, high1), hn::Max(high2, high3));
     range.least = hn::GetLane(hn::MinOfLanes(tag, low));
     range.largest = hn::GetLane(hn::MaxOfLanes(tag, high));
-    scalar::widen_range(from + done, pixels - done, range);
 }
 
-void widen_samples(const std::int16_t* from, std::size_t pixels, SampleRange& range) {
-    widen(from, pixels, range);
+template <class T, class Range>
+HWY_INLINE void widen_any(const T* first, std::size_t pixels, std::size_t rows,
+                          std::ptrdiff_t stride, Range& range) {
+    if (pixels < hn::Lanes(hn::ScalableTag<T>())) {
+        scalar::widen_range(first, pixels, rows, stride, range);
+    } else {
+        widen(first, pixels, rows, stride, range);
+    }
 }
 
-void widen_floats(const float* from, std::size_t pixels, FloatRange& range) {
-    widen(from, pixels, range);
+void widen_samples(const std::int16_t* first, std::size_t pixels, std::size_t rows,
+                   std::ptrdiff_t stride, SampleRange& range) {
+    widen_any(first, pixels, rows, stride, range);
+}
+
+void widen_floats(const float* first, std::size_t pixels, std::size_t rows, std::ptrdiff_t stride,
+                  FloatRange& range) {
+    widen_any(first, pixels, rows, stride, range);
 }
 
 #if HWY_NATIVE_FMA
@@ -146,26 +164,59 @@ HWY_INLINE void map_floats(const float* from, std::uint8_t* to, std::size_t pixe
     });
 }
 
-// Where products and sums are rounded once, two corrections of a product with the rounded
-// reciprocal give the rounded quotient: the first is within a unit in the last place, and from such
-// the second is exact (P. Markstein, 1990). Nothing below 1 matters, but the divisor and its
-// reciprocal must be far from both ends.
-void f32_to_u8_in_range(const float* from, std::uint8_t* to, std::size_t pixels, FloatRange range) {
-    const hn::ScalableTag<float> tag;
-    const float span = range.largest - range.least;
-    const auto divisor = hn::Set(tag, span);
 #if HWY_NATIVE_FMA
-    if (span > 0x1p-100F && span < 0x1p100F) {
-        const auto reciprocal = hn::Set(tag, 1.0F / span);
-        return map_floats(from, to, pixels, range.least, [&](auto numerator) HWY_ATTR {
-            const auto rough = hn::Mul(numerator, reciprocal);
-            const auto near =
-                hn::MulAdd(hn::NegMulAdd(rough, divisor, numerator), reciprocal, rough);
-            return hn::MulAdd(hn::NegMulAdd(near, divisor, numerator), reciprocal, near);
+// Positive floats in order.
+float neighbour(float value, std::int32_t steps) {
+    return std::bit_cast<float>(std::bit_cast<std::int32_t>(value) + steps);
+}
+
+// Whether products with both parts of the reciprocal have the whole parts of the quotients, below
+// 256. Products and quotients both grow with the numerator: of each whole part its first numerator
+// and the one before that tell for all.
+bool has_same_whole_parts(const FloatScale& scale) {
+    const auto product = [&](float numerator) HWY_ATTR {
+        return std::fma(numerator, scale.high, numerator * scale.low);
+    };
+    for (int i = 1; i < 256; ++i) {
+        const auto whole = static_cast<float>(i);
+        float first = whole * scale.span;
+        while (first / scale.span < whole) first = neighbour(first, 1);
+        while (neighbour(first, -1) / scale.span >= whole) first = neighbour(first, -1);
+        if (product(first) < whole || product(neighbour(first, -1)) >= whole) return false;
+    }
+    return true;
+}
+#endif
+
+FloatScale make_scale(FloatRange range, std::size_t pixels) {
+    FloatScale scale{.least = range.least, .span = range.largest - range.least};
+#if HWY_NATIVE_FMA
+    constexpr std::size_t kWorthwhile = std::size_t{1} << 12U;
+    // Far from where products overflow or lose bits.
+    if (pixels < kWorthwhile || !(scale.span > 0x1p-80F && scale.span < 0x1p80F)) return scale;
+    const double reciprocal = 1.0 / scale.span;
+    scale.high = static_cast<float>(reciprocal);
+    scale.low = static_cast<float>(reciprocal - scale.high);
+    scale.multiplies = has_same_whole_parts(scale);
+#else
+    static_cast<void>(pixels);
+#endif
+    return scale;
+}
+
+void f32_to_u8_scaled(const float* from, std::uint8_t* to, std::size_t pixels,
+                      const FloatScale& scale) {
+    const hn::ScalableTag<float> tag;
+#if HWY_NATIVE_FMA
+    if (scale.multiplies) {
+        const auto high = hn::Set(tag, scale.high), low = hn::Set(tag, scale.low);
+        return map_floats(from, to, pixels, scale.least, [&](auto numerator) HWY_ATTR {
+            return hn::MulAdd(numerator, high, hn::Mul(numerator, low));
         });
     }
 #endif
-    map_floats(from, to, pixels, range.least,
+    const auto divisor = hn::Set(tag, scale.span);
+    map_floats(from, to, pixels, scale.least,
                [&](auto numerator) HWY_ATTR { return hn::Div(numerator, divisor); });
 }
 
@@ -178,14 +229,17 @@ namespace zq {
 HWY_EXPORT(widen_samples);
 HWY_EXPORT(widen_floats);
 HWY_EXPORT(i16_to_u8_in_range);
-HWY_EXPORT(f32_to_u8_in_range);
+HWY_EXPORT(make_scale);
+HWY_EXPORT(f32_to_u8_scaled);
 
-void widen_range(const std::int16_t* from, std::size_t pixels, SampleRange& range) {
-    HWY_DYNAMIC_DISPATCH(widen_samples)(from, pixels, range);
+void widen_range(const std::int16_t* first, std::size_t pixels, std::size_t rows,
+                 std::ptrdiff_t stride, SampleRange& range) {
+    HWY_DYNAMIC_DISPATCH(widen_samples)(first, pixels, rows, stride, range);
 }
 
-void widen_range(const float* from, std::size_t pixels, FloatRange& range) {
-    HWY_DYNAMIC_DISPATCH(widen_floats)(from, pixels, range);
+void widen_range(const float* first, std::size_t pixels, std::size_t rows, std::ptrdiff_t stride,
+                 FloatRange& range) {
+    HWY_DYNAMIC_DISPATCH(widen_floats)(first, pixels, rows, stride, range);
 }
 
 void i16_to_u8_in_range(const std::int16_t* from, std::uint8_t* to, std::size_t pixels,
@@ -193,8 +247,13 @@ void i16_to_u8_in_range(const std::int16_t* from, std::uint8_t* to, std::size_t 
     HWY_DYNAMIC_DISPATCH(i16_to_u8_in_range)(from, to, pixels, range);
 }
 
-void f32_to_u8_in_range(const float* from, std::uint8_t* to, std::size_t pixels, FloatRange range) {
-    HWY_DYNAMIC_DISPATCH(f32_to_u8_in_range)(from, to, pixels, range);
+FloatScale scale_of(FloatRange range, std::size_t pixels) {
+    return HWY_DYNAMIC_DISPATCH(make_scale)(range, pixels);
+}
+
+void f32_to_u8_scaled(const float* from, std::uint8_t* to, std::size_t pixels,
+                      const FloatScale& scale) {
+    HWY_DYNAMIC_DISPATCH(f32_to_u8_scaled)(from, to, pixels, scale);
 }
 
 }  // namespace zq

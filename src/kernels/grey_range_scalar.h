@@ -6,10 +6,14 @@
 namespace zq::scalar {
 
 template <class Sample, class Range>
-void widen_range(const Sample* from, std::size_t pixels, Range& range) {
-    for (std::size_t i = 0; i < pixels; ++i) {
-        if (from[i] < range.least) range.least = from[i];
-        if (from[i] > range.largest) range.largest = from[i];
+void widen_range(const Sample* first, std::size_t pixels, std::size_t rows, std::ptrdiff_t stride,
+                 Range& range) {
+    for (std::size_t row = 0; row < rows; ++row) {
+        const Sample* from = first + static_cast<std::ptrdiff_t>(row) * stride;
+        for (std::size_t i = 0; i < pixels; ++i) {
+            if (from[i] < range.least) range.least = from[i];
+            if (from[i] > range.largest) range.largest = from[i];
+        }
     }
 }
 

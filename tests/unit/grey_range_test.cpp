@@ -49,11 +49,16 @@ TEST(GreyRange, SamplesOfEveryValueAndRange) {
 
 TEST(GreyRange, FloatsOfEveryKind) {
     const float inf = std::numeric_limits<float>::infinity(), nan = std::nanf("");
-    const FloatRange ranges[] = {{0, 1},       {-3, 1e-38F},     {-inf, 5},          {2, inf},
-                                 {7, 7},       {1e-3F, 3e-3F},   {-3e38F, 3e38F},    {0, 3e38F},
-                                 FloatRange(), {-0.1F, 88.3F},   {0, 0x1.fffffep5F}, {0, 255},
-                                 {3, 1e-30F},  {-1e-29F, 1e-30F}};
+    std::vector<FloatRange> ranges = {
+        {0, 1},       {-3, 1e-38F},     {-inf, 5},          {2, inf},
+        {7, 7},       {1e-3F, 3e-3F},   {-3e38F, 3e38F},    {0, 3e38F},
+        FloatRange(), {-0.1F, 88.3F},   {0, 0x1.fffffep5F}, {0, 255},
+        {3, 1e-30F},  {-1e-29F, 1e-30F}};
     std::mt19937 random(6);
+    for (int i = 0; i < 20; ++i) {
+        const float least = -static_cast<float>(random() % 1000);
+        ranges.push_back({least, least + 1e-3F * static_cast<float>(random())});
+    }
     zqtest::on_every_simd_target([&] {
         for (const FloatRange& range : ranges) {
             std::vector<float> values = {inf, -inf, nan, 0, -0.0F, range.least, range.largest};
@@ -72,26 +77,31 @@ TEST(GreyRange, FloatsOfEveryKind) {
             }
             std::erase_if(
                 values, [&](float value) { return value < range.least || value > range.largest; });
-            compare(values, range, f32_to_u8_in_range);
+            compare(values, range,
+                    [](const float* from, std::uint8_t* to, std::size_t pixels, FloatRange ends) {
+                        f32_to_u8_scaled(from, to, pixels, scale_of(ends, pixels));
+                    });
         }
     });
 }
 
 template <class Sample, class Range>
-void compare_ranges(const std::vector<Sample>& row) {
+void compare_ranges(const std::vector<Sample>& samples, std::size_t pixels) {
     Range expected, actual;
-    scalar::widen_range(row.data(), row.size(), expected);
-    widen_range(row.data(), row.size(), actual);
-    ASSERT_EQ(actual.least, expected.least) << row.size();
-    ASSERT_EQ(actual.largest, expected.largest) << row.size();
+    const auto stride = static_cast<std::ptrdiff_t>(samples.size() / 3);
+    scalar::widen_range(samples.data(), pixels, 3, stride, expected);
+    widen_range(samples.data(), pixels, 3, stride, actual);
+    ASSERT_EQ(actual.least, expected.least) << pixels;
+    ASSERT_EQ(actual.largest, expected.largest) << pixels;
 }
 
 TEST(GreyRange, EndsOfRowsOfEveryLength) {
     std::mt19937 random(7);
     zqtest::on_every_simd_target([&] {
         for (std::size_t pixels = 0; pixels < 150; ++pixels) {
-            std::vector<std::int16_t> samples(pixels);
-            std::vector<float> floats(pixels);
+            // Three rows with more between them.
+            std::vector<std::int16_t> samples(3 * (pixels + 5));
+            std::vector<float> floats(samples.size());
             for (auto& sample : samples) sample = static_cast<std::int16_t>(random());
             // NaN and infinities among them, and rows of negative numbers alone.
             for (auto& value : floats) {
@@ -100,8 +110,8 @@ TEST(GreyRange, EndsOfRowsOfEveryLength) {
                             : std::bit_cast<float>(static_cast<std::uint32_t>(random()));
                 if (random() % 4 == 0) value = std::nanf("");
             }
-            compare_ranges<std::int16_t, SampleRange>(samples);
-            compare_ranges<float, FloatRange>(floats);
+            compare_ranges<std::int16_t, SampleRange>(samples, pixels);
+            compare_ranges<float, FloatRange>(floats, pixels);
         }
     });
 }
