@@ -25,12 +25,28 @@ bool fits_in_place(const PixelView& view) {
     return !view.packed_colour || (view.width % 4 == 0 && view.line_width % 4 == 0);
 }
 
+// A bitmap in the making: what of a view, and where.
+struct Sheet {
+    const PixelView& view;
+    const Dib& dib;
+    Box shown;
+    std::uint8_t* rows;
+
+    std::uint8_t* row(std::int32_t y) const {
+        return rows + static_cast<std::size_t>(y - dib.first_row) * dib.stride();
+    }
+    std::size_t width() const { return static_cast<std::size_t>(shown.width()); }
+    std::size_t pixels() const { return width() * static_cast<std::size_t>(shown.height()); }
+};
+
+// Calls row(from, to, pixels) for what is shown of each row.
 template <class Row>
-void fill_rows(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>& scratch,
-               const Row& row) {
-    for (std::int32_t y = 0; y < dib.height; ++y) {
-        row(view.row(dib.first_row + y),
-            scratch.data() + static_cast<std::size_t>(y) * dib.stride());
+void fill_rows(const Sheet& sheet, const Row& row) {
+    const auto left = static_cast<std::size_t>(sheet.shown.left);
+    const auto bytes = static_cast<std::size_t>(sheet.dib.bits_per_pixel / 8);
+    for (std::int32_t y = sheet.shown.top; y < sheet.shown.bottom; ++y) {
+        row(sheet.view.row(y) + left * sheet.view.pixel_bytes(), sheet.row(y) + left * bytes,
+            sheet.width());
     }
 }
 
@@ -42,8 +58,8 @@ Range range_of(const PixelView& view) {
     return range;
 }
 
-void show_samples(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>& scratch) {
-    const auto width = static_cast<std::size_t>(view.width);
+void show_samples(const Sheet& sheet) {
+    const PixelView& view = sheet.view;
     const bool full_range = view.right_shift == 0 && view.bit_depth == 0;
     Reduction reduction(view.bit_depth);
     if (view.right_shift > 0) {
@@ -52,16 +68,24 @@ void show_samples(const PixelView& view, const Dib& dib, std::vector<std::uint8_
     }
     SampleRange range;
     if (full_range) range = range_of<std::int16_t, SampleRange>(view);
-    fill_rows(view, dib, scratch, [&](const std::uint8_t* from, std::uint8_t* to) {
+    fill_rows(sheet, [&](const std::uint8_t* from, std::uint8_t* to, std::size_t pixels) {
         const auto* samples = reinterpret_cast<const std::int16_t*>(from);
-        if (full_range) return i16_to_u8_in_range(samples, to, width, range);
-        i16_to_u8(samples, to, width, reduction);
+        if (full_range) return i16_to_u8_in_range(samples, to, pixels, range);
+        i16_to_u8(samples, to, pixels, reduction);
+    });
+}
+
+void show_floats(const Sheet& sheet) {
+    const FloatScale scale = scale_of(range_of<float, FloatRange>(sheet.view), sheet.pixels());
+    fill_rows(sheet, [&](const std::uint8_t* from, std::uint8_t* to, std::size_t pixels) {
+        f32_to_u8_scaled(reinterpret_cast<const float*>(from), to, pixels, scale);
     });
 }
 
 // Each row goes at once where the exchange of the quadrants takes it; an odd last row or column
 // stays.
-void show_spectrum(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>& scratch) {
+void show_spectrum(const Sheet& sheet) {
+    const PixelView& view = sheet.view;
     const double pixels = static_cast<double>(view.width) * view.height;
     const double scale = static_cast<float>(128.0 / pixels);
     const auto width = static_cast<std::size_t>(view.width);
@@ -69,49 +93,41 @@ void show_spectrum(const PixelView& view, const Dib& dib, std::vector<std::uint8
     for (std::int32_t y = 0; y < view.height; ++y) {
         const bool moves = y < 2 * half_height;
         const std::size_t half = moves ? width / 2 : 0;
-        const auto target = [&](std::int32_t row) {
-            return scratch.data() + static_cast<std::size_t>(row) * dib.stride();
-        };
         const auto* from = reinterpret_cast<const float*>(view.row(y));
         if (moves) {
-            std::uint8_t* to = target((y + half_height) % (2 * half_height));
+            std::uint8_t* to = sheet.row((y + half_height) % (2 * half_height));
             magnitude_to_u8(from, to + half, half, scale);
             magnitude_to_u8(from + 2 * half, to, half, scale);
         }
-        magnitude_to_u8(from + 4 * half, target(y) + 2 * half, width - 2 * half, scale);
+        magnitude_to_u8(from + 4 * half, sheet.row(y) + 2 * half, width - 2 * half, scale);
     }
 }
 
-void show(const PixelView& view, const Dib& dib, std::vector<std::uint8_t>& scratch) {
-    const auto width = static_cast<std::size_t>(view.width);
+void show(const Sheet& sheet) {
+    const PixelView& view = sheet.view;
     switch (view.type) {
         case PixelType::kI16:
-            return show_samples(view, dib, scratch);
-        case PixelType::kSgl: {
-            const FloatScale scale = scale_of(range_of<float, FloatRange>(view),
-                                              width * static_cast<std::size_t>(dib.height));
-            return fill_rows(view, dib, scratch, [&](const std::uint8_t* from, std::uint8_t* to) {
-                f32_to_u8_scaled(reinterpret_cast<const float*>(from), to, width, scale);
-            });
-        }
+            return show_samples(sheet);
+        case PixelType::kSgl:
+            return show_floats(sheet);
         case PixelType::kComplex:
-            return show_spectrum(view, dib, scratch);
+            return show_spectrum(sheet);
         case PixelType::kHsl:
-            return fill_rows(view, dib, scratch, [&](const std::uint8_t* from, std::uint8_t* to) {
-                hsl_to_rgb(from, to, width);
-            });
+            return fill_rows(sheet, hsl_to_rgb);
         case PixelType::kRgbU64: {
             RowConverter converter(view.type, PixelType::kRgb, {.bit_depth = view.bit_depth},
                                    Stores::kCached);
-            return fill_rows(view, dib, scratch, [&](const std::uint8_t* from, std::uint8_t* to) {
-                converter.convert(from, to, width);
-            });
+            return fill_rows(sheet,
+                             [&](const std::uint8_t* from, std::uint8_t* to, std::size_t pixels) {
+                                 converter.convert(from, to, pixels);
+                             });
         }
         case PixelType::kU8:
         case PixelType::kRgb:
-            return fill_rows(view, dib, scratch, [&](const std::uint8_t* from, std::uint8_t* to) {
-                std::memcpy(to, from, width * view.pixel_bytes());
-            });
+            return fill_rows(sheet,
+                             [&](const std::uint8_t* from, std::uint8_t* to, std::size_t pixels) {
+                                 std::memcpy(to, from, pixels * view.pixel_bytes());
+                             });
     }
 }
 
@@ -127,7 +143,7 @@ PixelView PixelView::of(const Image& image) {
             .bit_depth = image.bit_depth()};
 }
 
-Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch, RowRange rows) {
+Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch, const Box& shown) {
     const bool colour = view.type >= PixelType::kRgb;
     Dib dib{.width = view.width,
             .height = view.height,
@@ -140,13 +156,13 @@ Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch, RowRange
         return dib;
     }
     // The quadrants of a spectrum come from all over it.
-    if (view.type == PixelType::kComplex) rows = {};
-    dib.first_row = rows.first;
-    dib.height = std::min(rows.end, view.height) - rows.first;
+    const Box part = view.type == PixelType::kComplex ? view.bounds() : shown;
+    dib.first_row = part.top;
+    dib.height = part.bottom - part.top;
     const std::size_t bytes = checked_mul(dib.stride(), static_cast<std::size_t>(dib.height));
     if (scratch.size() < bytes) scratch = std::vector<std::uint8_t>(bytes);
     dib.bits = scratch.data();
-    show(view, dib, scratch);
+    show({view, dib, part, scratch.data()});
     return dib;
 }
 

@@ -2,7 +2,6 @@
 #pragma once
 
 #include <cstdint>
-#include <limits>
 #include <vector>
 
 #include "image/image.h"
@@ -22,6 +21,7 @@ struct PixelView {
     std::int32_t bit_depth = 0;
 
     static PixelView of(const Image& image);
+    Box bounds() const { return {0, 0, width, height}; }
     std::size_t pixel_bytes() const {
         return packed_colour ? 3 : static_cast<std::size_t>(bytes_per_pixel(type));
     }
@@ -31,14 +31,9 @@ struct PixelView {
     }
 };
 
-struct RowRange {
-    std::int32_t first = 0;
-    std::int32_t end = std::numeric_limits<std::int32_t>::max();  // or beyond the view
-};
-
-// The bitmap of a view that has pixels, at least of some rows (one or more), by the range of the
-// whole view. `scratch` gets the rows that cannot be shown in place, grows as it must, and must
-// live as long as the bitmap. Throws kNotEnoughMemory.
-Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch, RowRange rows = {});
+// The bitmap of a view, at least of a box of it (one pixel or more), by the range of the whole
+// view. `scratch` gets the rows that cannot be shown in place, grows as it must, and must live as
+// long as the bitmap; beside the box they are left as they were. Throws kNotEnoughMemory.
+Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch, const Box& shown);
 
 }  // namespace zq

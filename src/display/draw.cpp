@@ -117,7 +117,7 @@ void draw(DeviceContext& dc, const PixelView& view, const Box& source_box,
     }
     if (!lies_inside(source, view)) return;
     Scratch scratch;
-    Dib dib = make_dib(view, scratch.bytes(), {source.top, source.bottom});
+    Dib dib = make_dib(view, scratch.bytes(), source);
     source.top -= dib.first_row;
     source.bottom -= dib.first_row;
     dib.bottom_up = options.bottom_up;
