@@ -50,11 +50,20 @@ void fill_rows(const Sheet& sheet, const Row& row) {
     }
 }
 
+// In bands from the last one up, so that the first one, which is mapped next, is still in the
+// cache; but downwards within each, as the processor fetches ahead that way.
 template <class Sample, class Range>
 Range range_of(const PixelView& view) {
+    constexpr std::size_t kBandBytes = std::size_t{256} << 10;
+    const std::size_t row_bytes = static_cast<std::size_t>(view.line_width) * sizeof(Sample);
+    const auto band = static_cast<std::int32_t>(std::max<std::size_t>(1, kBandBytes / row_bytes));
     Range range;
-    widen_range(reinterpret_cast<const Sample*>(view.pixels), static_cast<std::size_t>(view.width),
-                static_cast<std::size_t>(view.height), view.line_width, range);
+    for (std::int32_t end = view.height, rows = 0; end > 0; end -= rows) {
+        rows = (end - 1) % band + 1;
+        widen_range(reinterpret_cast<const Sample*>(view.row(end - rows)),
+                    static_cast<std::size_t>(view.width), static_cast<std::size_t>(rows),
+                    view.line_width, range);
+    }
     return range;
 }
 

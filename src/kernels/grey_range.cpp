@@ -51,7 +51,7 @@ HWY_INLINE void widen(const T* first, std::size_t pixels, std::size_t rows, std:
         low = lesser(value, low);
         high = greater(value, high);
     };
-    for (std::size_t row = rows; row-- > 0;) {
+    for (std::size_t row = 0; row < rows; ++row) {
         const T* from = first + static_cast<std::ptrdiff_t>(row) * stride;
         take(low2, high2, from);
         std::size_t done = (0 - reinterpret_cast<std::uintptr_t>(from)) / sizeof(T) % lanes;

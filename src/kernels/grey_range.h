@@ -20,8 +20,7 @@ struct FloatRange {
     float largest = std::numeric_limits<float>::min();
 };
 
-// Widens a range by rows of so many pixels, `stride` apart. NaN takes no part. Goes from the last
-// row up, so that the first rows are in the cache afterwards.
+// Widens a range by rows of so many pixels, `stride` apart. NaN takes no part.
 void widen_range(const std::int16_t* first, std::size_t pixels, std::size_t rows,
                  std::ptrdiff_t stride, SampleRange& range);
 void widen_range(const float* first, std::size_t pixels, std::size_t rows, std::ptrdiff_t stride,
