@@ -40,7 +40,7 @@ void Bitmaps(benchmark::State& state, zq::PixelView view) {
     view.height = kHigh;
     std::vector<std::uint8_t> scratch;
     const auto make = [&] {
-        benchmark::DoNotOptimize(zq::make_dib(view, scratch, view.bounds()));
+        benchmark::DoNotOptimize(zq::make_dib(view, scratch, {view.bounds(), {}}));
         benchmark::ClobberMemory();
     };
     make();

@@ -34,6 +34,8 @@ class Canvas final : public DeviceContext {
     void include_clip(const Box& device) override;
     void set_stretching() override {}  // there is no other way
     void stretch(const Dib& dib, const Box& source, const Box& destination) override;
+    std::vector<std::int32_t> rows_to_stretch(const Box& source, const Box& destination,
+                                              bool bottom_up) override;
     bool fill(const Box& device, const Brush& brush) override;
     std::uint32_t button_face() override { return 0xF0F0F0; }
 

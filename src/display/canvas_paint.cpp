@@ -42,6 +42,13 @@ std::vector<std::int32_t> source_columns(const Box& target, const Box& part, con
     return columns;
 }
 
+// The source row of a target row.
+std::int64_t source_row(std::int32_t y, const Box& target, const Box& source, bool bottom_up) {
+    const std::int64_t line =
+        first_of_group(std::int64_t{y} - target.top, source.height(), target.height());
+    return bottom_up ? source.bottom - 1 - line : source.top + line;
+}
+
 // Lines in the lower half of each byte, as the system's brushes: bits that are set are gaps.
 constexpr std::array<Pattern, 6> kHatches = {{
     {0xFF, 0xFF, 0xFF, 0x00, 0xFF, 0xFF, 0xFF, 0xFF},  // horizontal
@@ -83,20 +90,31 @@ void Canvas::stretch(const Dib& dib, const Box& source, const Box& destination) 
         RowPainter painter(dib.bits_per_pixel, source_columns(target, part, source));
         std::int64_t painted = -1;
         for (std::int32_t y = part.top; y < part.bottom; ++y) {
-            const std::int64_t line =
-                first_of_group(std::int64_t{y} - target.top, source.height(), target.height());
+            const std::int64_t from = source_row(y, target, source, dib.bottom_up);
             std::uint32_t* to = row(y) + part.left;
-            if (line == painted) {
+            if (from == painted) {
                 // An enlarged row shows again.
                 std::memcpy(to, row(y - 1) + part.left,
                             static_cast<std::size_t>(part.width()) * sizeof(*to));
                 continue;
             }
-            painted = line;
-            const std::int64_t from = dib.bottom_up ? source.bottom - 1 - line : source.top + line;
+            painted = from;
             painter.paint(dib.bits + static_cast<std::size_t>(from) * dib.stride(), to);
         }
     }
+}
+
+std::vector<std::int32_t> Canvas::rows_to_stretch(const Box& source, const Box& destination,
+                                                  bool bottom_up) {
+    const Box target = to_device(destination);
+    const Box part = intersect(target, bounds());
+    std::vector<std::int32_t> rows;
+    if (target.height() >= source.height()) return rows;
+    rows.reserve(static_cast<std::size_t>(part.height()));
+    for (std::int32_t y = part.top; y < part.bottom; ++y) {
+        rows.push_back(static_cast<std::int32_t>(source_row(y, target, source, bottom_up)));
+    }
+    return rows;
 }
 
 bool Canvas::fill(const Box& device, const Brush& brush) {

@@ -18,35 +18,32 @@ bool is_aligned(const void* address) {
     return reinterpret_cast<std::uintptr_t>(address) % 4 == 0;
 }
 
-bool fits_in_place(const PixelView& view) {
-    if (!is_aligned(view.pixels)) return false;
-    if (view.type == PixelType::kU8) return view.width % 4 == 0 && view.line_width % 4 == 0;
-    if (view.type != PixelType::kRgb) return false;
-    return !view.packed_colour || (view.width % 4 == 0 && view.line_width % 4 == 0);
-}
-
 // A bitmap in the making: what of a view, and where.
 struct Sheet {
     const PixelView& view;
     const Dib& dib;
-    Box shown;
-    std::uint8_t* rows;
+    const Part& part;
+    std::uint8_t* bytes;
 
     std::uint8_t* row(std::int32_t y) const {
-        return rows + static_cast<std::size_t>(y - dib.first_row) * dib.stride();
+        return bytes + static_cast<std::size_t>(y - dib.first_row) * dib.stride();
     }
-    std::size_t width() const { return static_cast<std::size_t>(shown.width()); }
-    std::size_t pixels() const { return width() * static_cast<std::size_t>(shown.height()); }
 };
 
-// Calls row(from, to, pixels) for what is shown of each row.
+// Calls row(from, to, pixels) for what is wanted of each row.
 template <class Row>
 void fill_rows(const Sheet& sheet, const Row& row) {
-    const auto left = static_cast<std::size_t>(sheet.shown.left);
+    const Box& box = sheet.part.box;
+    const auto left = static_cast<std::size_t>(box.left);
     const auto bytes = static_cast<std::size_t>(sheet.dib.bits_per_pixel / 8);
-    for (std::int32_t y = sheet.shown.top; y < sheet.shown.bottom; ++y) {
+    const auto fill = [&](std::int32_t y) {
         row(sheet.view.row(y) + left * sheet.view.pixel_bytes(), sheet.row(y) + left * bytes,
-            sheet.width());
+            static_cast<std::size_t>(box.width()));
+    };
+    if (sheet.part.rows.empty()) {
+        for (std::int32_t y = box.top; y < box.bottom; ++y) fill(y);
+    } else {
+        for (const std::int32_t y : sheet.part.rows) fill(y);
     }
 }
 
@@ -85,7 +82,9 @@ void show_samples(const Sheet& sheet) {
 }
 
 void show_floats(const Sheet& sheet) {
-    const FloatScale scale = scale_of(range_of<float, FloatRange>(sheet.view), sheet.pixels());
+    const Box& box = sheet.part.box;
+    const FloatScale scale = scale_of(range_of<float, FloatRange>(sheet.view),
+                                      static_cast<std::size_t>(box.width() * box.height()));
     fill_rows(sheet, [&](const std::uint8_t* from, std::uint8_t* to, std::size_t pixels) {
         f32_to_u8_scaled(reinterpret_cast<const float*>(from), to, pixels, scale);
     });
@@ -142,6 +141,13 @@ void show(const Sheet& sheet) {
 
 }  // namespace
 
+bool fits_in_place(const PixelView& view) {
+    if (!is_aligned(view.pixels)) return false;
+    if (view.type == PixelType::kU8) return view.width % 4 == 0 && view.line_width % 4 == 0;
+    if (view.type != PixelType::kRgb) return false;
+    return !view.packed_colour || (view.width % 4 == 0 && view.line_width % 4 == 0);
+}
+
 PixelView PixelView::of(const Image& image) {
     const ImageRecord& record = image.record();
     return {.pixels = record.firstPixel,
@@ -152,7 +158,7 @@ PixelView PixelView::of(const Image& image) {
             .bit_depth = image.bit_depth()};
 }
 
-Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch, const Box& shown) {
+Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch, const Part& part) {
     const bool colour = view.type >= PixelType::kRgb;
     Dib dib{.width = view.width,
             .height = view.height,
@@ -165,9 +171,9 @@ Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch, const Bo
         return dib;
     }
     // The quadrants of a spectrum come from all over it.
-    const Box part = view.type == PixelType::kComplex ? view.bounds() : shown;
-    dib.first_row = part.top;
-    dib.height = part.bottom - part.top;
+    const Box box = view.type == PixelType::kComplex ? view.bounds() : part.box;
+    dib.first_row = box.top;
+    dib.height = box.bottom - box.top;
     const std::size_t bytes = checked_mul(dib.stride(), static_cast<std::size_t>(dib.height));
     if (scratch.size() < bytes) scratch = std::vector<std::uint8_t>(bytes);
     dib.bits = scratch.data();

@@ -31,9 +31,18 @@ struct PixelView {
     }
 };
 
-// The bitmap of a view, at least of a box of it (one pixel or more), by the range of the whole
-// view. `scratch` gets the rows that cannot be shown in place, grows as it must, and must live as
-// long as the bitmap; beside the box they are left as they were. Throws kNotEnoughMemory.
-Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch, const Box& shown);
+// Whether a bitmap can show the view's own pixels.
+bool fits_in_place(const PixelView& view);
+
+// What a bitmap must hold of a view.
+struct Part {
+    Box box;                         // one pixel or more
+    std::vector<std::int32_t> rows;  // of the box the only ones that are wanted; empty: all
+};
+
+// The bitmap of a view, at least of a part of it, by the range of the whole view. `scratch` gets
+// the rows that cannot be shown in place, grows as it must, and must live as long as the bitmap;
+// beside the part it is left as it was. Throws kNotEnoughMemory.
+Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch, const Part& part);
 
 }  // namespace zq

@@ -117,7 +117,11 @@ void draw(DeviceContext& dc, const PixelView& view, const Box& source_box,
     }
     if (!lies_inside(source, view)) return;
     Scratch scratch;
-    Dib dib = make_dib(view, scratch.bytes(), source);
+    Part part{.box = source, .rows = {}};
+    if (!fits_in_place(view)) {
+        part.rows = dc.rows_to_stretch(source, destination, options.bottom_up);
+    }
+    Dib dib = make_dib(view, scratch.bytes(), part);
     source.top -= dib.first_row;
     source.bottom -= dib.first_row;
     dib.bottom_up = options.bottom_up;

@@ -4,6 +4,7 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <vector>
 
 namespace zq {
 
@@ -86,6 +87,12 @@ class DeviceContext {
     // Draws the source box of the bitmap, which lies inside, into a box of logical units. Of a
     // bottom-up bitmap the box counts rows as memory does.
     virtual void stretch(const Dib& dib, const Box& source, const Box& destination) = 0;
+    // Which source rows that needs; none: all, or the system alone knows.
+    virtual std::vector<std::int32_t> rows_to_stretch(const Box& /*source*/,
+                                                      const Box& /*destination*/,
+                                                      bool /*bottom_up*/) {
+        return {};
+    }
     // Device pixels, brush origin at the box's corner; returns whether the brush could be made.
     virtual bool fill(const Box& device, const Brush& brush) = 0;
     virtual std::uint32_t button_face() = 0;  // 0x00BBGGRR

@@ -145,11 +145,18 @@ TEST(Display, ClippedDrawsShowWhatWholeOnesShowThere) {
 TEST(Display, ShrinksToTheFirstRowAndTheLastColumnOfEachGroup) {
     TestCanvas canvas(2, 2);
     const uint8_t pixels[] = {1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16};
-    EXPECT_EQ(Gen_PlotZoomedImage(canvas.handle, pixels, -2, 4, 4, 0, 0, 0, nullptr), 0U);
-    EXPECT_EQ(canvas.row(0), (Row{2, 4}));
-    EXPECT_EQ(canvas.row(1), (Row{10, 12}));
-    EXPECT_EQ(Gen_PlotZoomedImage(canvas.handle, pixels, -2, 4, 4, 0, 0, 1, nullptr), 0U);
-    EXPECT_EQ(canvas.row(0), (Row{14, 16})) << "the first row as it is seen";
+    uint16_t samples[16];  // mapped, and no other rows than are shown
+    std::transform(pixels, pixels + 16, samples, [](int pixel) { return pixel * 4; });
+    for (const bool mapped : {false, true}) {
+        const void* source = mapped ? static_cast<const void*>(samples) : pixels;
+        const uint32_t format = mapped ? ZQ_DRAW_GREY_16_BY_2 : ZQ_DRAW_GREY_8;
+        EXPECT_EQ(Gen_PlotZoomedImage(canvas.handle, source, -2, 4, 4, 0, 0, format, nullptr), 0U);
+        EXPECT_EQ(canvas.row(0), (Row{2, 4}));
+        EXPECT_EQ(canvas.row(1), (Row{10, 12}));
+        EXPECT_EQ(Gen_PlotZoomedImage(canvas.handle, source, -2, 4, 4, 0, 0, format + 1, nullptr),
+                  0U);
+        EXPECT_EQ(canvas.row(0), (Row{14, 16})) << "the first row as it is seen";
+    }
 }
 
 TEST(Display, PaintsEveryBrushButTheExcludedRectangle) {

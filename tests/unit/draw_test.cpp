@@ -52,7 +52,7 @@ PixelView view_of(const void* pixels, PixelType type, std::int32_t width, std::i
 
 std::vector<int> shown(const PixelView& view) {
     std::vector<std::uint8_t> scratch;
-    const Dib dib = make_dib(view, scratch, view.bounds());
+    const Dib dib = make_dib(view, scratch, {view.bounds(), {}});
     std::vector<int> bytes;
     for (std::int32_t y = 0; y < view.height; ++y) {
         const std::uint8_t* row = dib.bits + static_cast<std::size_t>(y) * dib.stride();
@@ -184,7 +184,7 @@ TEST(Draw, TakesRowsInPlaceWhereTheyAreAligned) {
         PixelView view = view_of(pixels + c.offset, c.type, c.width, 2);
         view.packed_colour = c.packed;
         std::vector<std::uint8_t> scratch;
-        EXPECT_EQ(make_dib(view, scratch, view.bounds()).bits == view.pixels, c.in_place)
+        EXPECT_EQ(make_dib(view, scratch, {view.bounds(), {}}).bits == view.pixels, c.in_place)
             << c.offset << ' ' << c.width;
     }
 }
