@@ -30,21 +30,26 @@ struct Sheet {
     }
 };
 
+// Calls row(y) for every row that is wanted.
+template <class Row>
+void for_each_row(const Part& part, const Row& row) {
+    if (part.rows.empty()) {
+        for (std::int32_t y = part.box.top; y < part.box.bottom; ++y) row(y);
+    } else {
+        for (const std::int32_t y : part.rows) row(y);
+    }
+}
+
 // Calls row(from, to, pixels) for what is wanted of each row.
 template <class Row>
 void fill_rows(const Sheet& sheet, const Row& row) {
     const Box& box = sheet.part.box;
     const auto left = static_cast<std::size_t>(box.left);
     const auto bytes = static_cast<std::size_t>(sheet.dib.bits_per_pixel / 8);
-    const auto fill = [&](std::int32_t y) {
+    for_each_row(sheet.part, [&](std::int32_t y) {
         row(sheet.view.row(y) + left * sheet.view.pixel_bytes(), sheet.row(y) + left * bytes,
             static_cast<std::size_t>(box.width()));
-    };
-    if (sheet.part.rows.empty()) {
-        for (std::int32_t y = box.top; y < box.bottom; ++y) fill(y);
-    } else {
-        for (const std::int32_t y : sheet.part.rows) fill(y);
-    }
+    });
 }
 
 // In bands from the last one up, so that the first one, which is mapped next, is still in the
@@ -90,7 +95,7 @@ void show_floats(const Sheet& sheet) {
     });
 }
 
-// Each row goes at once where the exchange of the quadrants takes it; an odd last row or column
+// Each row comes from where the exchange of the quadrants takes it; an odd last row or column
 // stays.
 void show_spectrum(const Sheet& sheet) {
     const PixelView& view = sheet.view;
@@ -98,17 +103,17 @@ void show_spectrum(const Sheet& sheet) {
     const double scale = static_cast<float>(128.0 / pixels);
     const auto width = static_cast<std::size_t>(view.width);
     const std::int32_t half_height = view.height / 2;
-    for (std::int32_t y = 0; y < view.height; ++y) {
+    for_each_row(sheet.part, [&](std::int32_t y) {
         const bool moves = y < 2 * half_height;
         const std::size_t half = moves ? width / 2 : 0;
-        const auto* from = reinterpret_cast<const float*>(view.row(y));
-        if (moves) {
-            std::uint8_t* to = sheet.row((y + half_height) % (2 * half_height));
-            magnitude_to_u8(from, to + half, half, scale);
-            magnitude_to_u8(from + 2 * half, to, half, scale);
-        }
-        magnitude_to_u8(from + 4 * half, sheet.row(y) + 2 * half, width - 2 * half, scale);
-    }
+        const std::int32_t origin = moves ? (y + half_height) % (2 * half_height) : y;
+        const auto* from = reinterpret_cast<const float*>(view.row(origin));
+        std::uint8_t* to = sheet.row(y);
+        magnitude_to_u8(from, to + half, half, scale);
+        magnitude_to_u8(from + 2 * half, to, half, scale);
+        const auto* stays = reinterpret_cast<const float*>(view.row(y));
+        magnitude_to_u8(stays + 4 * half, to + 2 * half, width - 2 * half, scale);
+    });
 }
 
 void show(const Sheet& sheet) {
@@ -170,10 +175,8 @@ Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch, const Pa
         dib.bits = view.pixels;
         return dib;
     }
-    // The quadrants of a spectrum come from all over it.
-    const Box box = view.type == PixelType::kComplex ? view.bounds() : part.box;
-    dib.first_row = box.top;
-    dib.height = box.bottom - box.top;
+    dib.first_row = part.box.top;
+    dib.height = part.box.bottom - part.box.top;
     const std::size_t bytes = checked_mul(dib.stride(), static_cast<std::size_t>(dib.height));
     if (scratch.size() < bytes) scratch = std::vector<std::uint8_t>(bytes);
     dib.bits = scratch.data();

@@ -153,6 +153,11 @@ TEST(Draw, ShowsEveryType) {
         spectrum[2 * i] = 9.0F / 128 * (static_cast<float>(i) + 0.5F);
     EXPECT_EQ(shown(view_of(spectrum.data(), PixelType::kComplex, 3, 3)),
               (std::vector<int>{4, 3, 2, 1, 0, 5, 6, 7, 8}));
+    std::vector<std::uint8_t> scratch;
+    const Dib middle =
+        make_dib(view_of(spectrum.data(), PixelType::kComplex, 3, 3), scratch, {{0, 1, 3, 2}, {}});
+    EXPECT_EQ(middle.first_row, 1);
+    EXPECT_EQ(std::vector<int>(middle.bits, middle.bits + 3), (std::vector<int>{1, 0, 5}));
 
     const std::uint16_t wide[] = {100, 300, 65535, 1};
     PixelView wide_view = view_of(wide, PixelType::kRgbU64, 1, 1);
