@@ -140,7 +140,9 @@ void read_palette(InputFile& file, const Raw& raw, BmpHeader& header) {
     const std::uint32_t full = indexed ? 1U << header.bits_per_pixel : 0;
     const std::uint32_t said = core ? 0 : raw.word(kPaletteEntries);
     std::uint32_t count = said == 0 ? full : std::min(said, full);
-    if (header.data_offset == 0) header.data_offset = raw.end + count * entry;
+    // Some writers leave the offset out, or forget the palette in it.
+    const bool forgotten = header.data_offset == 0 || (indexed && header.data_offset == raw.end);
+    if (forgotten) header.data_offset = raw.end + count * entry;
     if (header.data_offset < raw.end) throw kInvalidFileHeader;
     count = std::min(count, (header.data_offset - raw.end) / entry);
 

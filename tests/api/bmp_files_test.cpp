@@ -253,6 +253,16 @@ TEST_F(BmpFilesTest, DecodesRuns) {
     }
 }
 
+TEST_F(BmpFilesTest, PixelsFollowThePaletteWhenTheOffsetForgetsIt) {
+    const Bmp good = {
+        .width = 3, .height = 2, .palette = std::string(1024, '\1'), .data = "abc.def."};
+    for (const uint32_t offset : {0U, 54U}) {
+        Picture picture(ZQ_TYPE_U8);
+        ASSERT_EQ(read(good.bytes().replace(10, 4, le(offset)), picture), 0);
+        EXPECT_EQ(picture.pixels(), "defabc") << offset;
+    }
+}
+
 TEST_F(BmpFilesTest, RefusesWrongFieldsAndKeepsTheImage) {
     Bmp good = {.width = 3, .height = 2, .palette = std::string(1024, '\1'), .data = "abc.def."};
     const std::string file = good.bytes();
@@ -270,6 +280,7 @@ TEST_F(BmpFilesTest, RefusesWrongFieldsAndKeepsTheImage) {
         {"size not filled in", 2, 0, 0},
         {"largest size", 2, 0xFFFFFFFF, kUnsupported},
         {"offset not filled in", 10, 0, 0},
+        {"offset without the palette", 10, 54, 0},
         {"pixels inside the header", 10, 53, kBadHeader},
         {"pixels inside the palette", 10, 56, 0},
         {"pixels cut by one", 10, 1079, kUnreadable},
