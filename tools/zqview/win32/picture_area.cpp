@@ -7,6 +7,7 @@
 #include <algorithm>
 
 #include "failure.h"
+#include "window_procedure.h"
 
 namespace {
 
@@ -35,21 +36,9 @@ int32_t rounded_down(int32_t value, int32_t multiple) {
 }  // namespace
 
 PictureArea::PictureArea(HWND parent, Events events) : events_(std::move(events)) {
-    register_class(&PictureArea::procedure);
+    register_class(&window_procedure<PictureArea>);
     window_ = CreateWindowExA(0, kClass, "", WS_CHILD | WS_VISIBLE, 0, 0, 0, 0, parent, nullptr,
                               GetModuleHandleA(nullptr), this);
-}
-
-LRESULT CALLBACK PictureArea::procedure(HWND window, UINT message, WPARAM wide, LPARAM word) {
-    if (message == WM_NCCREATE) {
-        auto* self =
-            static_cast<PictureArea*>(reinterpret_cast<const CREATESTRUCTA*>(word)->lpCreateParams);
-        self->window_ = window;
-        SetWindowLongPtrA(window, GWLP_USERDATA, reinterpret_cast<LONG_PTR>(self));
-    }
-    auto* self = reinterpret_cast<PictureArea*>(GetWindowLongPtrA(window, GWLP_USERDATA));
-    return self != nullptr ? self->handle(message, wide, word)
-                           : DefWindowProcA(window, message, wide, word);
 }
 
 LRESULT PictureArea::handle(UINT message, WPARAM wide, LPARAM word) {

@@ -31,9 +31,11 @@ class PictureArea {
     void change_view(const std::function<void(View&)>& change);
     const View& view() const { return view_; }
 
-  private:
-    static LRESULT CALLBACK procedure(HWND window, UINT message, WPARAM wide, LPARAM word);
+    // For the window procedure.
+    void adopt(HWND window) { window_ = window; }
     LRESULT handle(UINT message, WPARAM wide, LPARAM word);
+
+  private:
     void paint();
     void move_pointer(Point at);
     // Tells what is under the pointer, which a change of the view changes too.

@@ -12,6 +12,7 @@
 
 #include "failure.h"
 #include "folder.h"
+#include "window_procedure.h"
 
 namespace {
 
@@ -25,7 +26,7 @@ constexpr int kToTheEnd = INT_MAX / 2;
 
 Viewer::Viewer() {
     WNDCLASSA description{};
-    description.lpfnWndProc = &Viewer::procedure;
+    description.lpfnWndProc = &window_procedure<Viewer>;
     description.hInstance = GetModuleHandleA(nullptr);
     description.hCursor = LoadCursorA(nullptr, reinterpret_cast<LPCSTR>(IDC_ARROW));
     description.lpszClassName = kClass;
@@ -33,18 +34,6 @@ Viewer::Viewer() {
     CreateWindowExA(WS_EX_ACCEPTFILES, kClass, kName, WS_OVERLAPPEDWINDOW, CW_USEDEFAULT,
                     CW_USEDEFAULT, kWidth, kHeight, nullptr, nullptr, description.hInstance, this);
     ShowWindow(window_, SW_SHOWDEFAULT);
-}
-
-LRESULT CALLBACK Viewer::procedure(HWND window, UINT message, WPARAM wide, LPARAM word) {
-    if (message == WM_NCCREATE) {
-        auto* self =
-            static_cast<Viewer*>(reinterpret_cast<const CREATESTRUCTA*>(word)->lpCreateParams);
-        self->window_ = window;
-        SetWindowLongPtrA(window, GWLP_USERDATA, reinterpret_cast<LONG_PTR>(self));
-    }
-    auto* self = reinterpret_cast<Viewer*>(GetWindowLongPtrA(window, GWLP_USERDATA));
-    return self != nullptr ? self->handle(message, wide, word)
-                           : DefWindowProcA(window, message, wide, word);
 }
 
 LRESULT Viewer::handle(UINT message, WPARAM wide, LPARAM word) {

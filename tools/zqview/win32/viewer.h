@@ -24,9 +24,11 @@ class Viewer {
     // Handles messages until the window is closed; returns the exit status.
     int run();
 
-  private:
-    static LRESULT CALLBACK procedure(HWND window, UINT message, WPARAM wide, LPARAM word);
+    // For the window procedure.
+    void adopt(HWND window) { window_ = window; }
     LRESULT handle(UINT message, WPARAM wide, LPARAM word);
+
+  private:
     void create_parts();
     void arrange();
     bool press(WPARAM key);
