@@ -1,0 +1,20 @@
+// Windows whose messages an object handles: T::adopt(HWND) is called when the window is made with
+// the object as its creation parameter, T::handle(message, wide, word) for all that follows.
+#ifndef ZQVIEW_WINDOW_PROCEDURE_H
+#define ZQVIEW_WINDOW_PROCEDURE_H
+
+#include <windows.h>
+
+template <class T>
+LRESULT CALLBACK window_procedure(HWND window, UINT message, WPARAM wide, LPARAM word) {
+    if (message == WM_NCCREATE) {
+        const auto* made = reinterpret_cast<const CREATESTRUCTA*>(word);
+        static_cast<T*>(made->lpCreateParams)->adopt(window);
+        SetWindowLongPtrA(window, GWLP_USERDATA, reinterpret_cast<LONG_PTR>(made->lpCreateParams));
+    }
+    auto* object = reinterpret_cast<T*>(GetWindowLongPtrA(window, GWLP_USERDATA));
+    return object != nullptr ? object->handle(message, wide, word)
+                             : DefWindowProcA(window, message, wide, word);
+}
+
+#endif
