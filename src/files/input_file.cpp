@@ -46,7 +46,11 @@ void InputFile::read_header_bytes(void* bytes, std::size_t count) {
 }
 
 void InputFile::read_rows(platform::Rows<std::uint8_t> rows) {
-    if (!platform::read_rows(stream_.get(), rows)) throw kUnableToReadData;
+    if (!try_read_rows(rows)) throw kUnableToReadData;
+}
+
+bool InputFile::try_read_rows(platform::Rows<std::uint8_t> rows) noexcept {
+    return platform::read_rows(stream_.get(), rows);
 }
 
 void InputFile::require(std::uint64_t offset, std::uint64_t count) const {

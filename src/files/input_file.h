@@ -38,6 +38,7 @@ class InputFile {
 
     // All rows from here on, or kUnableToReadData is thrown; nothing else can be read then.
     void read_rows(platform::Rows<std::uint8_t> rows);
+    bool try_read_rows(platform::Rows<std::uint8_t> rows) noexcept;
 
     // Throws kUnableToReadData when the file is known to end before `offset` + `count`. What a
     // header announces goes through here before memory is taken for it.

@@ -8,6 +8,7 @@
 
 #include "base/checked.h"
 #include "files/orientation.h"
+#include "files/tiff_inflater.h"
 #include "files/unsigned_grey.h"
 #include "files/write_job.h"
 
@@ -15,18 +16,11 @@ namespace zq {
 
 namespace {
 
-// Strips up to here are decoded whole, which is faster; larger ones row by row.
+// Strips up to here are decoded whole, which is faster; larger ones a few rows at a time.
 constexpr std::uint64_t kLargestWholeStrip = std::uint64_t{4} << 20;
+constexpr std::size_t kInflatedAtOnce = std::size_t{128} << 10;
 constexpr std::int32_t kUnitCentimetre = 4;
 constexpr std::int32_t kUnitInch = 8;
-
-// libtiff takes the pixels of an uncompressed strip as they stand, but for their byte order.
-void swap_samples(std::uint8_t* bytes, std::size_t count, int bits) {
-    const auto samples = static_cast<tmsize_t>(count / (static_cast<std::size_t>(bits) / 8));
-    if (bits == 16) TIFFSwabArrayOfShort(reinterpret_cast<std::uint16_t*>(bytes), samples);
-    if (bits == 32) TIFFSwabArrayOfLong(reinterpret_cast<std::uint32_t*>(bytes), samples);
-    if (bits == 64) TIFFSwabArrayOfDouble(reinterpret_cast<double*>(bytes), samples);
-}
 
 bool is_uncompressed(TIFF* tiff, const TiffLayout& layout) {
     std::uint16_t order = FILLORDER_MSB2LSB;
@@ -136,15 +130,36 @@ void TiffReader::read_plane_of_strips(const Image& image, int plane) {
         throw kInvalidFileHeader;
     const std::uint32_t most = rows_per_strip(tiff, layout_);
     const bool uncompressed = is_uncompressed(tiff, layout_);
+    if (uncompressed && sink_.is_plain() && read_at_once(image, most)) return;
     const bool whole = layout_.row_bytes(layout_.width) * most <= kLargestWholeStrip;
-    const auto read = uncompressed ? &TiffReader::read_uncompressed
-                      : whole      ? &TiffReader::read_strip
-                                   : &TiffReader::read_lines;
+    const auto read = uncompressed                         ? &TiffReader::read_uncompressed
+                      : whole                              ? &TiffReader::read_strip
+                      : TiffInflater::suits(tiff, layout_) ? &TiffReader::read_deflated
+                                                           : &TiffReader::read_lines;
     for (std::uint32_t y = 0; y < layout_.height; y += most) {
         const std::uint32_t rows = std::min(most, layout_.height - y);
         (this->*read)(image, plane, y, rows);
         if (rows < most) break;  // y must not wrap
     }
+}
+
+// Pixels that stand in the file as in the image, all rows in one run. False: they do not.
+bool TiffReader::read_at_once(const Image& image, std::uint32_t strip_rows) {
+    TIFF* const tiff = session_.tiff();
+    const auto line = checked_narrow<std::size_t>(layout_.row_bytes(layout_.width));
+    const std::uint64_t strip_bytes = std::uint64_t{line} * strip_rows;
+    const std::uint64_t start = TIFFGetStrileOffset(tiff, 0);
+    const std::uint32_t strips = (layout_.height - 1) / strip_rows + 1;
+    if (start == 0 || TIFFIsByteSwapped(tiff) != 0) return false;
+    for (std::uint32_t i = 0; i < strips; ++i) {
+        const std::uint64_t rows = std::min(strip_rows, layout_.height - i * strip_rows);
+        if (TIFFGetStrileOffset(tiff, i) != checked_add(start, i * strip_bytes) ||
+            TIFFGetStrileByteCount(tiff, i) < rows * line)
+            return false;
+    }
+    if (!session_.read_rows_at(start, {image.row(0), image.row_stride(), line, layout_.height}))
+        throw kUnableToReadData;
+    return true;
 }
 
 void TiffReader::read_uncompressed(const Image& image, int plane, std::uint32_t y,
@@ -161,9 +176,24 @@ void TiffReader::read_uncompressed(const Image& image, int plane, std::uint32_t 
         std::uint8_t* const bytes = plain ? row : buffer_.data();
         if (!session_.read_at(checked_add(start, std::uint64_t{i} * line), bytes, line))
             throw kUnableToReadData;
-        if (TIFFIsByteSwapped(tiff) != 0) swap_samples(bytes, line, std::max(layout_.bits, 8));
+        session_.swap_samples({bytes, line}, layout_.bits);
         if (!plain) sink_.put(plane, bytes, row, layout_.width);
     }
+}
+
+void TiffReader::read_deflated(const Image& image, int plane, std::uint32_t y, std::uint32_t rows) {
+    TiffInflater inflater(session_, layout_,
+                          TIFFComputeStrip(session_.tiff(), y, static_cast<std::uint16_t>(plane)));
+    const auto line = checked_narrow<std::size_t>(layout_.row_bytes(layout_.width));
+    const std::size_t most = std::clamp<std::size_t>(kInflatedAtOnce / line, 1, rows);
+    buffer_.resize(line * most);
+    for (std::uint32_t done = 0; done < rows;) {
+        const std::size_t count = std::min<std::size_t>(most, rows - done);
+        inflater.read_rows(std::span(buffer_).first(count * line));
+        for (std::size_t i = 0; i < count; ++i, ++done)
+            sink_.put(plane, &buffer_[i * line], pixel_of(image, 0, y + done), layout_.width);
+    }
+    inflater.finish(std::uint64_t{line} * rows_per_strip(session_.tiff(), layout_));
 }
 
 // Damaged strips of some codecs come short without an error; what is missing counts as 0.

@@ -37,7 +37,9 @@ class TiffReader {
     void read_stored(Image& image);
     void read_foreign(const Image& image);
     void read_plane_of_strips(const Image& image, int plane);
+    bool read_at_once(const Image& image, std::uint32_t strip_rows);
     void read_uncompressed(const Image& image, int plane, std::uint32_t y, std::uint32_t rows);
+    void read_deflated(const Image& image, int plane, std::uint32_t y, std::uint32_t rows);
     void read_strip(const Image& image, int plane, std::uint32_t y, std::uint32_t rows);
     void read_lines(const Image& image, int plane, std::uint32_t y, std::uint32_t rows);
     void read_plane_of_tiles(const Image& image, int plane);

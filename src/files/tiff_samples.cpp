@@ -79,6 +79,20 @@ void rgb48_to_bgra64(const std::uint16_t* from, std::uint16_t* to, std::size_t p
     }
 }
 
+bool are_pixels(const TiffLayout& layout) {
+    if (layout.used_samples() != 1 || layout.colour == TiffColour::kInvertedGrey) return false;
+    switch (layout.pixel_type()) {
+        case PixelType::kU8:
+            return layout.bits == 8;
+        case PixelType::kI16:
+            return layout.bits == 16;
+        case PixelType::kSgl:
+            return layout.bits == 32 && layout.number == TiffNumber::kFloat;
+        default:
+            return false;
+    }
+}
+
 template <class Sample>
 void unpremultiply(Sample* row, std::size_t pixels) {
     constexpr std::uint32_t kWhole = std::numeric_limits<Sample>::max();
@@ -95,29 +109,28 @@ void unpremultiply(Sample* row, std::size_t pixels) {
 
 }  // namespace
 
-std::size_t TiffSampleSink::step() const {
-    return layout_.separate ? 1 : static_cast<std::size_t>(layout_.samples);
+void bgra64_to_rgb48(const std::uint16_t* __restrict from, std::uint16_t* __restrict to,
+                     std::size_t pixels) {
+    for (std::size_t i = 0; i < pixels; ++i) {
+        to[3 * i] = from[4 * i + 2];
+        to[3 * i + 1] = from[4 * i + 1];
+        to[3 * i + 2] = from[4 * i];
+    }
 }
 
-bool TiffSampleSink::is_plain() const {
-    if (step() != 1 || layout_.used_samples() != 1) return false;
-    if (layout_.colour == TiffColour::kInvertedGrey) return false;
-    switch (layout_.pixel_type()) {
-        case PixelType::kU8:
-            return layout_.bits == 8;
-        case PixelType::kI16:
-            return layout_.bits == 16;
-        case PixelType::kSgl:
-            return layout_.bits == 32 && layout_.number == TiffNumber::kFloat;
-        default:
-            return false;
-    }
+TiffSampleSink::TiffSampleSink(const TiffLayout& layout)
+    : layout_(layout), is_plain_(step() == 1 && are_pixels(layout)) {}
+
+std::size_t TiffSampleSink::step() const {
+    return layout_.separate ? 1 : static_cast<std::size_t>(layout_.samples);
 }
 
 void TiffSampleSink::put(int plane, const std::uint8_t* samples, std::uint8_t* row,
                          std::size_t pixels) {
     const int bits = layout_.bits;
-    if (bits > 16 || layout_.number != TiffNumber::kUnsigned) {
+    if (is_plain_) {
+        std::memcpy(row, samples, pixels * static_cast<std::size_t>(bits / 8));
+    } else if (bits > 16 || layout_.number != TiffNumber::kUnsigned) {
         put_numbers(samples, row, pixels);
     } else if (bits == 8) {
         put_as(plane, samples, row, pixels);

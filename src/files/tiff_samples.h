@@ -12,10 +12,10 @@ namespace zq {
 // Puts stretches of rows of the file into rows of an image of the layout's type.
 class TiffSampleSink {
   public:
-    explicit TiffSampleSink(const TiffLayout& layout) : layout_(layout) {}
+    explicit TiffSampleSink(const TiffLayout& layout);
 
     // Whether rows of the file are rows of the image as they are.
-    bool is_plain() const;
+    bool is_plain() const { return is_plain_; }
 
     // `samples` as libtiff delivers them, in the machine's byte order, aligned for their size: all
     // samples of `pixels` pixels, or only those of one plane. Planes come in order; each stretch of
@@ -37,8 +37,12 @@ class TiffSampleSink {
     std::size_t step() const;
 
     TiffLayout layout_;
+    bool is_plain_;
     std::vector<std::uint8_t> bytes_;  // samples of a number of bits of their own, unpacked
     std::vector<std::uint16_t> words_;
 };
+
+// The other way round: three samples of each four, red first. No overlap.
+void bgra64_to_rgb48(const std::uint16_t* from, std::uint16_t* to, std::size_t pixels);
 
 }  // namespace zq

@@ -123,4 +123,16 @@ bool TiffSession::read_at(std::uint64_t offset, void* bytes, std::size_t count) 
     return stream_.seek(offset) && stream_.read(bytes, count) == count;
 }
 
+bool TiffSession::read_rows_at(std::uint64_t offset, platform::Rows<std::uint8_t> rows) noexcept {
+    return stream_.seek(offset) && stream_.input->try_read_rows(rows);
+}
+
+void TiffSession::swap_samples(std::span<std::uint8_t> bytes, int bits) const {
+    if (TIFFIsByteSwapped(tiff_) == 0 || bits < 16) return;
+    const auto samples = static_cast<tmsize_t>(bytes.size() / (static_cast<std::size_t>(bits) / 8));
+    if (bits == 16) TIFFSwabArrayOfShort(reinterpret_cast<std::uint16_t*>(bytes.data()), samples);
+    if (bits == 32) TIFFSwabArrayOfLong(reinterpret_cast<std::uint32_t*>(bytes.data()), samples);
+    if (bits == 64) TIFFSwabArrayOfDouble(reinterpret_cast<double*>(bytes.data()), samples);
+}
+
 }  // namespace zq

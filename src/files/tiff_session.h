@@ -4,6 +4,7 @@
 #include <tiffio.h>
 
 #include <cstdint>
+#include <span>
 
 #include "files/input_file.h"
 #include "files/output_file.h"
@@ -41,6 +42,10 @@ class TiffSession {
 
     // Bytes of the file itself. False unless all of them came.
     bool read_at(std::uint64_t offset, void* bytes, std::size_t count) noexcept;
+    // The same for rows; nothing else of the file can be read afterwards.
+    bool read_rows_at(std::uint64_t offset, platform::Rows<std::uint8_t> rows) noexcept;
+    // Samples of the file itself, of so many bits, into the machine's byte order.
+    void swap_samples(std::span<std::uint8_t> bytes, int bits) const;
 
   private:
     void open(const char* mode);

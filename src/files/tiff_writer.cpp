@@ -7,7 +7,10 @@
 #include <cstring>
 #include <optional>
 
+#include "files/tiff_samples.h"
 #include "files/unsigned_grey.h"
+#include "kernels/colour_rows.h"
+#include "kernels/png_samples.h"
 
 namespace zq {
 
@@ -55,19 +58,6 @@ int samples_of(PixelType type) {
 
 int bits_of(PixelType type) {
     return type == PixelType::kI16 || type == PixelType::kRgbU64 ? 16 : 8;
-}
-
-// Blue, green, red and, where `kChannels` is 4, alpha to red, green, blue.
-template <class Sample, std::size_t kChannels>
-void copy_colour(const std::uint8_t* from, std::uint8_t* to, std::int32_t pixels) {
-    for (std::int32_t x = 0; x < pixels; ++x) {
-        std::array<Sample, 3> bgr;
-        std::memcpy(bgr.data(), from, sizeof(bgr));
-        std::swap(bgr[0], bgr[2]);
-        std::memcpy(to, bgr.data(), sizeof(bgr));
-        from += kChannels * sizeof(Sample);
-        to += sizeof(bgr);
-    }
 }
 
 void copy_shifted(const std::uint8_t* from, std::uint8_t* to, std::int32_t pixels) {
@@ -131,16 +121,22 @@ TiffWriter::TiffWriter(OutputFile& file, const WriteJob& job, const char* name)
 void TiffWriter::choose_grey16() {
     const PixelView& pixels = job_.pixels;
     if (pixels.type != PixelType::kI16 || pixels.packing == Packing::kUnsigned16) return;
-    bool any_negative = false, any_other = false;
-    for (std::int32_t y = 0; y < pixels.height; ++y) {
-        const auto* row = reinterpret_cast<const std::int16_t*>(pixels.row(y));
-        const auto negative = std::count_if(row, row + pixels.width, [](auto v) { return v < 0; });
-        any_negative = any_negative || negative != 0;
-        any_other = any_other || negative != pixels.width;
-    }
-    if (pixels.sample_offset == kWholeRangeOffset && any_other) {
+    const auto any_row = [&pixels](auto test) {
+        for (std::int32_t y = 0; y < pixels.height; ++y) {
+            if (test(pixels.row(y))) return true;
+        }
+        return false;
+    };
+    const auto has_others = [&pixels](const std::uint8_t* row) {
+        const auto* const values = reinterpret_cast<const std::int16_t*>(row);
+        return std::any_of(values, values + pixels.width, [](auto v) { return v >= 0; });
+    };
+    const auto has_negatives = [this](const std::uint8_t* row) {
+        return any_above_signed(row, row_bytes_);  // the same bit
+    };
+    if (pixels.sample_offset == kWholeRangeOffset && any_row(has_others)) {
         grey16_ = Grey16::kShifted;
-    } else if (any_negative) {
+    } else if (any_row(has_negatives)) {
         grey16_ = Grey16::kSigned;
     }
 }
@@ -207,12 +203,14 @@ void TiffWriter::set_resolution() {
 void TiffWriter::copy_row(std::int32_t y, std::uint8_t* to) const {
     const PixelView& pixels = job_.pixels;
     const std::uint8_t* const from = pixels.row(y);
+    const auto width = static_cast<std::size_t>(pixels.width);
     if (pixels.type == PixelType::kRgbU64) {
-        copy_colour<std::uint16_t, 4>(from, to, pixels.width);
+        bgra64_to_rgb48(reinterpret_cast<const std::uint16_t*>(from),
+                        reinterpret_cast<std::uint16_t*>(to), width);
     } else if (pixels.packing == Packing::kPacked24) {
-        copy_colour<std::uint8_t, 3>(from, to, pixels.width);
+        bgr_to_rgb(from, to, width);
     } else if (pixels.type == PixelType::kRgb) {
-        copy_colour<std::uint8_t, 4>(from, to, pixels.width);
+        bgra_to_rgb(from, to, width);
     } else if (grey16_ == Grey16::kShifted) {
         copy_shifted(from, to, pixels.width);
     } else {

@@ -202,6 +202,61 @@ TEST_F(TiffReadTest, DecodesWhatItsStripsHold) {
     }
 }
 
+// Strips too large to be inflated as a whole.
+TEST_F(TiffReadTest, InflatesLargeStrips) {
+    constexpr uint32_t kWide = 1500, kBytes = 4200000;
+    struct Case {
+        const char* name;
+        uint32_t bits, samples;
+        bool differences, big_endian;
+        size_t spoilt;  // byte of the stream, from its end; 0: none
+        Bytes behind;   // the last row
+        ZqError code = 0;
+    };
+    for (const Case& c :
+         {Case{"16 bits", 16, 1, false, true, 0, ""}, Case{"differences", 8, 3, true, false, 0, ""},
+          Case{"differences of 16 bits", 16, 3, true, true, 0, ""},
+          Case{"a row too many", 16, 1, false, false, 0, Bytes(kWide, 'x')},
+          Case{"a wrong check sum", 16, 1, false, false, 1, "", kUnreadable},
+          Case{"a damaged stream", 16, 1, false, false, 9000, "", kUnreadable},
+          Case{"cut short", 16, 1, false, false, 0, "?", kUnreadable}}) {
+        SCOPED_TRACE(c.name);
+        const uint32_t high = kBytes * 8 / (kWide * c.samples * c.bits);
+        BareTiff file = bare_tiff(kWide, high, c.samples == 1 ? 1 : 2, Samples(c.samples, c.bits));
+        file.big_endian = c.big_endian;
+        const uint32_t mask = c.bits == 8 ? 0xFF : 0x7FFF;
+        const auto sample = [&](uint32_t x, uint32_t y, uint32_t i) {
+            return (x * x / 64 + y * 3 + i * 71) & mask;
+        };
+        Bytes stored, expected;
+        for (uint32_t y = 0; y < high; ++y) {
+            Samples row;
+            for (uint32_t x = 0; x < kWide; ++x) {
+                for (uint32_t i = 0; i < c.samples; ++i) {
+                    const uint32_t before = c.differences && x > 0 ? sample(x - 1, y, i) : 0;
+                    row.push_back(sample(x, y, i) - before);
+                }
+                const Samples s = {sample(x, y, 2), sample(x, y, 1), sample(x, y, 0), 0};
+                if (c.samples == 1) append<uint16_t>(expected, {s[2]});
+                if (c.samples == 3 && c.bits == 8) append<uint8_t>(expected, {s[0], s[1], s[2], 0});
+                if (c.samples == 3 && c.bits == 16)
+                    append<uint16_t>(expected, {s[0], s[1], s[2], 0});
+            }
+            stored += packed(file, row, c.bits);
+        }
+        const bool cut = c.behind == "?";
+        Bytes stream = deflated(cut ? stored : stored + c.behind);
+        if (cut) stream.resize(stream.size() / 2);
+        if (c.spoilt != 0) stream[stream.size() - c.spoilt] ^= 0x55;
+        file = with_strip(file, 8, stream);
+        if (c.differences) file.fields[317].values = {2};
+        store(file);
+        Picture target(ZQ_TYPE_SGL, 1, 1);
+        EXPECT_EQ(read(target), c.code);
+        EXPECT_EQ(target.pixels() == expected, c.code == 0);
+    }
+}
+
 TEST_F(TiffReadTest, TurnsPicturesUpright) {
     const char* const expected[] = {"",       "abcdef", "cbafed", "fedcba", "defabc",
                                     "adbecf", "daebfc", "fcebda", "cfbead", "abcdef"};
