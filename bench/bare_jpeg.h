@@ -1,10 +1,14 @@
-// The least that can be done with libjpeg: its own loop over rows in memory, with the tables of a
-// stream that exists. What the quality codec is measured against.
+// The least that can be done with libjpeg: its own loop over rows in memory. What the quality codec
+// (with the tables of a stream that exists) and JPEG files (with libjpeg's own) are measured
+// against.
 #pragma once
 
 #include <cstddef>
 #include <cstdint>
 #include <span>
+#include <string>
+
+#include "rows.h"
 
 namespace zqbench {
 
@@ -27,5 +31,9 @@ struct JpegRows {
 // Returns the size of the encoded stream, which is thrown away.
 std::size_t bare_encode(const JpegRows& rows, std::span<const std::uint8_t> stream_with_tables);
 void bare_decode(const JpegRows& rows, std::span<const std::uint8_t> stream);
+
+void bare_jpeg_write(const std::string& path, const JpegRows& rows);
+// Grey, or blue, green, red, filler.
+Rows bare_jpeg_read(const std::string& path);
 
 }  // namespace zqbench

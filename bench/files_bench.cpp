@@ -1,191 +1,152 @@
-// Image files against the least that can be done: PNG beside a bare loop over libpng with the same
-// settings, AIPD beside one fwrite or fread of the same bytes. A picture of 12 million pixels.
+// AIPD and BMP, which need no library, beside the least that can be done: one fwrite or fread of
+// as many bytes in one block, and plain loops over rows and their pixels. BMP beside OpenCV, too.
 // Run: zqvis_bench --benchmark_filter=File
-#include <benchmark/benchmark.h>
-#include <png.h>
-#include <zqvissvc/files.h>
-#include <zqvissvc/image.h>
-
-#include <cmath>
+#include <algorithm>
 #include <cstdio>
-#include <cstring>
-#include <filesystem>
-#include <memory>
-#include <string>
+#include <vector>
 
 #include "file.h"
-#include "image.h"
-#include "paired.h"
+#include "photo_file.h"
 
 namespace {
 
 using zqbench::check;
 using zqbench::File;
+using zqbench::FilePaths;
 using zqbench::Image;
+using zqbench::kPhotoHeight;
+using zqbench::kPhotoWidth;
 using zqbench::open;
 
-constexpr int32_t kWidth = 4000;
-constexpr int32_t kHeight = 3000;
-constexpr int kLevel = 6;
-
-std::string temporary(const char* name) {
-    return (std::filesystem::temp_directory_path() / name).string();
+zqbench::Photograph photograph(const benchmark::State& state) {
+    return zqbench::Photograph(static_cast<int32_t>(state.range(0)));
 }
 
-// Like a photograph: soft shapes and the noise of a sensor.
-void paint(const Image& image) {
-    uint32_t random = 1;
-    for (int32_t y = 0; y < kHeight; ++y) {
-        uint8_t* pixel = image.row(y);
-        for (int32_t x = 0; x < kWidth; ++x) {
-            const double shade =
-                110 + 50 * std::sin(x * 0.004) + 40 * std::cos(y * 0.003 + x * 0.01);
-            for (int channel = 0; channel < 3; ++channel) {
-                random = random * 1664525U + 1013904223U;
-                *pixel++ = static_cast<uint8_t>(shade + channel * 9 + (random >> 29));
-            }
-            *pixel++ = 0;
-        }
-    }
+constexpr size_t kAipdHeader = 512;
+
+// The pixels of an AIPD file, row by row, with fread or fwrite.
+template <class Transfer>
+void each_aipd_row(const std::string& path, const char* mode, const Image& image,
+                   Transfer transfer) {
+    const File file = open(path, mode);
+    check(std::fseek(file.get(), kAipdHeader, SEEK_SET) == 0, "fseek");
+    for (int32_t y = 0; y < kPhotoHeight; ++y)
+        check(transfer(image.row(y), 1, image.row_bytes(), file.get()) == image.row_bytes(), "row");
 }
 
-void bare_png_write(const std::string& path, const Image& image) {
-    const File file = open(path, "wb");
-    png_structp png = png_create_write_struct(PNG_LIBPNG_VER_STRING, nullptr, nullptr, nullptr);
-    png_infop info = png_create_info_struct(png);
-    png_init_io(png, file.get());
-    png_set_IHDR(png, info, kWidth, kHeight, 8, PNG_COLOR_TYPE_RGB, PNG_INTERLACE_NONE,
-                 PNG_COMPRESSION_TYPE_DEFAULT, PNG_FILTER_TYPE_DEFAULT);
-    png_set_compression_level(png, kLevel);
-    png_set_filter(png, PNG_FILTER_TYPE_BASE, PNG_ALL_FILTERS);
-    png_write_info(png, info);
-    png_set_bgr(png);
-    png_set_filler(png, 0, PNG_FILLER_AFTER);
-    for (int32_t y = 0; y < kHeight; ++y) png_write_row(png, image.row(y));
-    png_write_end(png, info);
-    png_destroy_write_struct(&png, &info);
+std::vector<uint8_t> bytes_of_aipd(const Image& image) {
+    return std::vector<uint8_t>(kAipdHeader + image.row_bytes() * size_t{kPhotoHeight}, 1);
 }
-
-// Into rows of the same layout, which are made anew as an image's are.
-void bare_png_read(const std::string& path) {
-    const File file = open(path, "rb");
-    png_structp png = png_create_read_struct(PNG_LIBPNG_VER_STRING, nullptr, nullptr, nullptr);
-    png_infop info = png_create_info_struct(png);
-    png_init_io(png, file.get());
-    png_read_info(png, info);
-    png_set_filler(png, 0, PNG_FILLER_AFTER);
-    png_set_bgr(png);
-    png_read_update_info(png, info);
-    const size_t stride = png_get_rowbytes(png, info);
-    const std::unique_ptr<uint8_t[]> pixels(new uint8_t[stride * kHeight]);
-    for (int32_t y = 0; y < kHeight; ++y) {
-        png_read_row(png, pixels.get() + stride * static_cast<size_t>(y), nullptr);
-    }
-    png_read_end(png, nullptr);
-    png_destroy_read_struct(&png, &info, nullptr);
-}
-
-bool same_pixels(const Image& a, const Image& b) {
-    for (int32_t y = 0; y < kHeight; ++y) {
-        if (std::memcmp(a.row(y), b.row(y), size_t{4} * kWidth) != 0) return false;
-    }
-    return true;
-}
-
-void write_file(const std::string& path, const Image& image, const char* type) {
-    check(ZqWriteFileByName(path.c_str(), image.handle(), nullptr, type, nullptr) == 0, "write");
-}
-
-void read_file(const std::string& path, const Image& image) {
-    check(ZqReadFile(image.handle(), path.c_str(), nullptr, nullptr, nullptr, nullptr) == 0,
-          "read");
-}
-
-void FilePngWrite(benchmark::State& state) {
-    const Image image(ZQ_TYPE_RGB, kWidth, kHeight);
-    paint(image);
-    const std::string ours = temporary("zqbench-ours.png"), bare = temporary("zqbench-bare.png");
-    zqbench::run_paired(
-        state, [&] { write_file(ours, image, "PNG"); }, [&] { bare_png_write(bare, image); });
-    check(std::filesystem::file_size(ours) <= std::filesystem::file_size(bare), "comparison");
-    std::filesystem::remove(ours);
-    std::filesystem::remove(bare);
-}
-BENCHMARK(FilePngWrite)->UseManualTime()->Unit(benchmark::kMillisecond)->Iterations(7);
-
-void FilePngRead(benchmark::State& state) {
-    const Image image(ZQ_TYPE_RGB, kWidth, kHeight), target(ZQ_TYPE_RGB);
-    paint(image);
-    const std::string path = temporary("zqbench.png");
-    write_file(path, image, "PNG");
-    const bool fresh = state.range(0) == 0;
-    zqbench::run_paired(
-        state,
-        [&] {
-            if (fresh) {
-                read_file(path, Image(ZQ_TYPE_RGB));
-            } else {
-                read_file(path, target);
-            }
-        },
-        [&] { bare_png_read(path); });
-    read_file(path, target);
-    check(same_pixels(image, target), "comparison");
-    std::filesystem::remove(path);
-}
-// 0: into a new image; 1: into one that already has the shape and keeps its addresses.
-BENCHMARK(FilePngRead)
-    ->Arg(0)
-    ->Arg(1)
-    ->UseManualTime()
-    ->Unit(benchmark::kMillisecond)
-    ->Iterations(9);
 
 void FileAipdWrite(benchmark::State& state) {
-    const auto type = static_cast<int32_t>(state.range(0));
-    const Image image(type, kWidth, kHeight);
-    const std::string ours = temporary("zqbench-ours.aipd"), plain = temporary("zqbench.bytes");
-    write_file(ours, image, "AIPD");
-    const auto size = static_cast<size_t>(std::filesystem::file_size(ours));
-    const std::unique_ptr<uint8_t[]> bytes(new uint8_t[size]());
-    zqbench::run_paired(
-        state, [&] { write_file(ours, image, "AIPD"); },
-        [&] {
-            const File file = open(plain, "wb");
-            check(std::fwrite(bytes.get(), 1, size, file.get()) == size, "fwrite");
-        });
-    state.counters["bytes"] = static_cast<double>(size);
-    std::filesystem::remove(ours);
-    std::filesystem::remove(plain);
+    const zqbench::Photograph image = photograph(state);
+    const FilePaths paths(".aipd");
+    const std::vector<uint8_t> bytes = bytes_of_aipd(image);
+    zqbench::compare_write(
+        state, paths.ours, [&] { zqbench::write_file(paths.ours, image, zqbench::kAipd); },
+        {{"fwrite", paths.bare,
+          [&] {
+              const File file = open(paths.bare, "wb");
+              check(std::fwrite(bytes.data(), 1, bytes.size(), file.get()) == bytes.size(),
+                    "fwrite");
+          }},
+         {"fwrite of rows", paths.opencv,
+          [&] { each_aipd_row(paths.opencv, "wb", image, std::fwrite); }}});
+    check(state.counters["size_ratio"] == 1.0, "same size");
 }
-BENCHMARK(FileAipdWrite)
-    ->Arg(ZQ_TYPE_U8)
-    ->Arg(ZQ_TYPE_RGB)
-    ->UseManualTime()
-    ->Unit(benchmark::kMillisecond)
-    ->Iterations(31);
 
+// Into an image that has the shape already, as that of a host that reads one file after another.
 void FileAipdRead(benchmark::State& state) {
-    const auto type = static_cast<int32_t>(state.range(0));
-    const Image image(type, kWidth, kHeight);
-    const std::string path = temporary("zqbench.aipd");
-    write_file(path, image, "AIPD");
-    const auto size = static_cast<size_t>(std::filesystem::file_size(path));
-    const std::unique_ptr<uint8_t[]> bytes(new uint8_t[size]());
-    zqbench::run_paired(
-        state, [&] { read_file(path, image); },
-        [&] {
-            const File file = open(path, "rb");
-            check(std::fread(bytes.get(), 1, size, file.get()) == size, "fread");
-        });
-    state.counters["bytes"] = static_cast<double>(size);
-    std::filesystem::remove(path);
+    const zqbench::Photograph image = photograph(state);
+    const Image target(image.type(), kPhotoWidth, kPhotoHeight),
+        plain(image.type(), kPhotoWidth, kPhotoHeight);
+    const FilePaths paths(".aipd");
+    std::vector<uint8_t> bytes = bytes_of_aipd(image);
+    zqbench::write_file(paths.ours, image, zqbench::kAipd);
+    zqbench::compare_read_into(
+        state, target, paths.ours,
+        {{"fread",
+          [&] {
+              const File file = open(paths.ours, "rb");
+              check(std::fread(bytes.data(), 1, bytes.size(), file.get()) == bytes.size(), "fread");
+          }},
+         {"fread of rows", [&] { each_aipd_row(paths.ours, "rb", plain, std::fread); }}});
+    zqbench::check_same(image, plain);
+    zqbench::check_same(image, target);
 }
-BENCHMARK(FileAipdRead)
-    ->Arg(ZQ_TYPE_U8)
-    ->Arg(ZQ_TYPE_RGB)
-    ->UseManualTime()
-    ->Unit(benchmark::kMillisecond)
-    ->Iterations(31);
+
+// One line of a file at a time.
+class BmpLines {
+  public:
+    BmpLines(const std::string& path, const char* mode, const Image& image)
+        : image_(image),
+          is_grey_(image.handle()->type == ZQ_TYPE_U8),
+          file_(open(path, mode)),
+          line_((is_grey_ ? 1 : 3) * size_t{kPhotoWidth}) {
+        constexpr long kColours = 54, kGreys = 54 + 1024;  // where the pixels begin
+        check(std::fseek(file_.get(), is_grey_ ? kGreys : kColours, SEEK_SET) == 0, "fseek");
+    }
+
+    void write() {
+        for (int32_t y = kPhotoHeight; y-- > 0;) {
+            const uint8_t* row = image_.row(y);
+            for (size_t x = 0; !is_grey_ && x < kPhotoWidth; ++x)
+                std::copy_n(row + 4 * x, 3, &line_[3 * x]);
+            const void* bytes = is_grey_ ? row : line_.data();
+            check(std::fwrite(bytes, 1, line_.size(), file_.get()) == line_.size(), "fwrite");
+        }
+    }
+
+    void read() {
+        for (int32_t y = kPhotoHeight; y-- > 0;) {
+            uint8_t* row = image_.row(y);
+            void* bytes = is_grey_ ? row : line_.data();
+            check(std::fread(bytes, 1, line_.size(), file_.get()) == line_.size(), "fread");
+            for (size_t x = 0; !is_grey_ && x < kPhotoWidth; ++x) {
+                std::copy_n(&line_[3 * x], 3, row + 4 * x);
+                row[4 * x + 3] = 0;
+            }
+        }
+    }
+
+  private:
+    const Image& image_;
+    bool is_grey_;
+    File file_;
+    std::vector<uint8_t> line_;
+};
+
+void FileBmpWrite(benchmark::State& state) {
+    const zqbench::Photograph image = photograph(state);
+    const FilePaths paths(".bmp");
+    zqbench::compare_write(
+        state, paths.ours, [&] { zqbench::write_file(paths.ours, image, zqbench::kBmp); },
+        {{"loop", paths.bare, [&] { BmpLines(paths.bare, "wb", image).write(); }},
+         {"OpenCV", paths.opencv,
+          zqbench::opencv_write(paths.opencv, zqbench::pixels_of(image), "BMP")}});
+    check(state.counters["size_ratio"] == 1.0, "same size");
+}
+
+void FileBmpRead(benchmark::State& state) {
+    const zqbench::Photograph image = photograph(state);
+    const Image target(image.type(), kPhotoWidth, kPhotoHeight),
+        plain(image.type(), kPhotoWidth, kPhotoHeight);
+    const FilePaths paths(".bmp");
+    zqbench::write_file(paths.ours, image, zqbench::kBmp);
+    zqbench::compare_read_into(state, target, paths.ours,
+                               {{"loop", [&] { BmpLines(paths.ours, "rb", plain).read(); }},
+                                {"OpenCV", zqbench::opencv_read(paths.ours)}});
+    zqbench::check_same(image, target);
+    zqbench::check_same(image, plain);
+}
+
+void types(benchmark::internal::Benchmark* benchmark) {
+    benchmark->Arg(ZQ_TYPE_U8)->Arg(ZQ_TYPE_RGB)->Apply(zqbench::timed_file)->Iterations(31);
+}
+
+BENCHMARK(FileAipdWrite)->Apply(types);
+BENCHMARK(FileAipdRead)->Apply(types);
+BENCHMARK(FileBmpWrite)->Apply(types);
+BENCHMARK(FileBmpRead)->Apply(types);
 
 }  // namespace

@@ -1,50 +1,24 @@
-// JPEG 2000 files against the least that can be done: OpenJPEG with the same settings and its own
-// file streams, and a plain loop between its samples and pixels. 12 million pixels.
+// JPEG 2000 files beside the least that can be done: OpenJPEG with the same settings and its own
+// file streams, and a plain loop between its samples and pixels; and beside OpenCV.
 // Run: zqvis_bench --benchmark_filter=FileJpeg2000
-#include <benchmark/benchmark.h>
 #include <openjpeg.h>
-#include <zqvissvc/files.h>
 
 #include <array>
-#include <cstring>
-#include <filesystem>
-#include <memory>
 #include <string>
 
-#include "image.h"
-#include "paired.h"
-#include "photograph.h"
+#include "photo_file.h"
 
 namespace {
 
 using zqbench::check;
 using zqbench::Image;
+using zqbench::kPhotoHeight;
+using zqbench::kPhotoWidth;
 
-constexpr int32_t kWidth = 4000, kHeight = 3000;
 constexpr int32_t kLossless = 1000;
 
-struct Paths {
-    std::string ours = name("ours.j2k"), bare = name("bare.j2k");
-    ~Paths() {
-        std::filesystem::remove(ours);
-        std::filesystem::remove(bare);
-    }
-    static std::string name(const char* which) {
-        return (std::filesystem::temp_directory_path() / "zqbench-jpeg2000-").string() + which;
-    }
-};
-
-void paint(const Image& image) {
-    uint32_t random = 1;
-    for (int32_t y = 0; y < kHeight; ++y) {
-        const int channels = image.handle()->type == ZQ_TYPE_U8 ? 1 : 4;
-        zqbench::paint_row(image.row(y), kWidth, y, channels, 1, random);
-    }
-}
-
 void write_file(const std::string& path, const Image& image, int32_t quality) {
-    const ZqWriteOptions options = {1, {quality, 0, 0}};
-    check(ZqWriteFileByCode(path.c_str(), image.handle(), &options, 7, nullptr) == 0, "write");
+    zqbench::write_file(path, image, zqbench::kJpeg2000, {1, {quality, 0, 0}});
 }
 
 void bare_write(const std::string& path, const Image& image, int32_t quality) {
@@ -52,19 +26,20 @@ void bare_write(const std::string& path, const Image& image, int32_t quality) {
     std::array<opj_image_cmptparm_t, 3> shapes{};
     for (opj_image_cmptparm_t& shape : shapes) {
         shape.dx = shape.dy = 1;
-        shape.w = kWidth;
-        shape.h = kHeight;
+        shape.w = kPhotoWidth;
+        shape.h = kPhotoHeight;
         shape.prec = 8;
     }
     opj_image_t* samples = opj_image_create(channels, shapes.data(), OPJ_CLRSPC_UNSPECIFIED);
     check(samples != nullptr, "samples");
-    samples->x1 = kWidth;
-    samples->y1 = kHeight;
-    for (int32_t y = 0; y < kHeight; ++y) {
+    samples->x1 = kPhotoWidth;
+    samples->y1 = kPhotoHeight;
+    for (int32_t y = 0; y < kPhotoHeight; ++y) {
         const uint8_t* row = image.row(y);
         for (uint32_t c = 0; c < channels; ++c) {
-            OPJ_INT32* to = samples->comps[c].data + size_t{kWidth} * static_cast<size_t>(y);
-            for (size_t x = 0; x < kWidth; ++x) to[x] = channels == 1 ? row[x] : row[4 * x + 2 - c];
+            OPJ_INT32* to = samples->comps[c].data + size_t{kPhotoWidth} * static_cast<size_t>(y);
+            for (size_t x = 0; x < kPhotoWidth; ++x)
+                to[x] = channels == 1 ? row[x] : row[4 * x + 2 - c];
         }
     }
     opj_cparameters_t parameters;
@@ -89,8 +64,7 @@ void bare_write(const std::string& path, const Image& image, int32_t quality) {
     opj_image_destroy(samples);
 }
 
-// Into rows of the same layout, which are made anew as an image's are.
-void bare_read(const std::string& path) {
+zqbench::Rows bare_read(const std::string& path) {
     opj_stream_t* stream = opj_stream_create_default_file_stream(path.c_str(), OPJ_TRUE);
     opj_codec_t* codec = opj_create_decompress(OPJ_CODEC_J2K);
     opj_dparameters_t parameters;
@@ -103,55 +77,62 @@ void bare_read(const std::string& path) {
           "decode");
     opj_stream_destroy(stream);
     opj_destroy_codec(codec);
-    const size_t channels = samples->numcomps == 1 ? 1 : 4, count = size_t{kWidth} * kHeight;
-    const std::unique_ptr<uint8_t[]> pixels(new uint8_t[count * channels]);
-    if (channels == 1) {
-        for (size_t i = 0; i < count; ++i)
-            pixels[i] = static_cast<uint8_t>(samples->comps[0].data[i]);
-    } else {
-        for (size_t i = 0; i < count; ++i) {
+    const size_t channels = samples->numcomps == 1 ? 1 : 4;
+    zqbench::Rows picture(channels * kPhotoWidth, kPhotoHeight);
+    const OPJ_INT32* planes[3];
+    for (size_t c = 0; c < 3; ++c) planes[c] = samples->comps[channels == 1 ? 0 : c].data;
+    for (size_t y = 0; y < size_t{kPhotoHeight}; ++y) {
+        uint8_t* const row = picture.row(y);
+        const size_t start = y * kPhotoWidth;
+        for (size_t x = 0; x < size_t{kPhotoWidth}; ++x) {
+            if (channels == 1) {
+                row[x] = static_cast<uint8_t>(planes[0][start + x]);
+                continue;
+            }
             for (size_t c = 0; c < 3; ++c)
-                pixels[4 * i + 2 - c] = static_cast<uint8_t>(samples->comps[c].data[i]);
-            pixels[4 * i + 3] = 0;
+                row[4 * x + 2 - c] = static_cast<uint8_t>(planes[c][start + x]);
+            row[4 * x + 3] = 0;
         }
     }
-    benchmark::DoNotOptimize(pixels.get());
     opj_image_destroy(samples);
+    return picture;
+}
+
+// Lossy files of OpenCV's are asked for by another measure.
+zqbench::Job opencv_write(const std::string& path, const Image& image, int32_t quality) {
+    if (quality != kLossless) return {};
+    return zqbench::opencv_write(path, zqbench::pixels_of(image), "JPEG 2000");
 }
 
 void FileJpeg2000Write(benchmark::State& state) {
-    const Image image(static_cast<int32_t>(state.range(0)), kWidth, kHeight);
+    const zqbench::Photograph image(static_cast<int32_t>(state.range(0)));
     const auto quality = static_cast<int32_t>(state.range(1));
-    paint(image);
-    const Paths paths;
-    zqbench::run_paired(
-        state, [&] { write_file(paths.ours, image, quality); },
-        [&] { bare_write(paths.bare, image, quality); });
-    check(std::filesystem::file_size(paths.ours) == std::filesystem::file_size(paths.bare), "same");
+    const zqbench::FilePaths paths(".j2k"), boxed(".jp2");
+    zqbench::compare_write(
+        state, paths.ours, [&] { write_file(paths.ours, image, quality); },
+        {{"OpenJPEG", paths.bare, [&] { bare_write(paths.bare, image, quality); }},
+         {"OpenCV", boxed.opencv, opencv_write(boxed.opencv, image, quality)}});
+    check(state.counters["size_ratio"] == 1.0, "same size");
 }
 
 void FileJpeg2000Read(benchmark::State& state) {
-    const auto type = static_cast<int32_t>(state.range(0));
-    const Image image(type, kWidth, kHeight);
-    paint(image);
-    const Paths paths;
+    const zqbench::Photograph image(static_cast<int32_t>(state.range(0)));
+    const Image copy(image.type());
+    const zqbench::FilePaths paths(".jp2"), bare(".j2k");
     write_file(paths.ours, image, static_cast<int32_t>(state.range(1)));
-    zqbench::run_paired(
-        state,
-        [&] {
-            const Image target(type);
-            check(ZqReadFile(target.handle(), paths.ours.c_str(), nullptr, nullptr, nullptr,
-                             nullptr) == 0,
-                  "read");
-        },
-        [&] { bare_read(paths.ours); });
+    write_file(bare.ours, image, static_cast<int32_t>(state.range(1)));
+    zqbench::compare_read(state, bare.ours, image.type(),
+                          {{"OpenJPEG", [&] { bare_read(bare.ours); }},
+                           {"OpenCV", zqbench::opencv_read(paths.ours)}});
+    zqbench::read_file(bare.ours, copy);
+    zqbench::check_same(copy, bare_read(bare.ours));
 }
 
 void cases(benchmark::internal::Benchmark* benchmark) {
     for (const int32_t type : {ZQ_TYPE_U8, ZQ_TYPE_RGB}) {
         for (const int32_t quality : {750, kLossless}) benchmark->Args({type, quality});
     }
-    benchmark->UseManualTime()->Iterations(3);
+    benchmark->Apply(zqbench::timed_file)->Iterations(3);
 }
 
 BENCHMARK(FileJpeg2000Write)->Apply(cases);

@@ -15,4 +15,13 @@ Job opencv_bayer(std::string_view /*name*/) {
     return {};
 }
 
+Job opencv_write(const std::string& /*path*/, const Pixels& /*pixels*/,
+                 std::string_view /*settings*/) {
+    return {};
+}
+
+Job opencv_read(const std::string& /*path*/) {
+    return {};
+}
+
 }  // namespace zqbench

@@ -1,191 +1,180 @@
-// PNG beside a bare loop over libpng with the same settings, in time and size, and the memory that
-// both take beside the picture. Pictures are raw samples of 4000 x 3000 pixels from the files that
-// the environment names (ZQBENCH_PNG_U8, _I16, _RGB, _RGBU64: as images hold them), or painted.
+// PNG beside a bare loop over libpng with the same settings, in time and size, and beside OpenCV.
 // Run: zqvis_bench --benchmark_filter=Png
-#include <benchmark/benchmark.h>
 #include <png.h>
-#include <zqvissvc/files.h>
+#include <zqvissvc/custom_data.h>
 
-#include <cstdio>
-#include <cstdlib>
-#include <cstring>
-#include <filesystem>
-#include <memory>
+#include <iterator>
 #include <string>
-#include <vector>
 
-#include "file.h"
-#include "image.h"
-#include "paired.h"
-#include "peak_memory.h"
-#include "photograph.h"
+#include "bare_png.h"
+#include "photo_file.h"
 
 namespace {
 
+using zqbench::bare_png_read;
+using zqbench::bare_png_write;
 using zqbench::check;
-using zqbench::File;
+using zqbench::FilePaths;
 using zqbench::Image;
-using zqbench::open;
-
-constexpr int32_t kWidth = 4000, kHeight = 3000;
+using zqbench::kPng;
+using zqbench::PngShape;
 
 struct Kind {
     int32_t type;
-    int colour_type, depth;
-    const char* samples;  // names a file
+    PngShape shape;
 };
 
-constexpr Kind kKinds[] = {{ZQ_TYPE_U8, PNG_COLOR_TYPE_GRAY, 8, "ZQBENCH_PNG_U8"},
-                           {ZQ_TYPE_I16, PNG_COLOR_TYPE_GRAY, 16, "ZQBENCH_PNG_I16"},
-                           {ZQ_TYPE_RGB, PNG_COLOR_TYPE_RGB, 8, "ZQBENCH_PNG_RGB"},
-                           {ZQ_TYPE_RGBU64, PNG_COLOR_TYPE_RGB, 16, "ZQBENCH_PNG_RGBU64"}};
+constexpr Kind kKinds[] = {{ZQ_TYPE_U8, {PNG_COLOR_TYPE_GRAY, 8}},
+                           {ZQ_TYPE_I16, {PNG_COLOR_TYPE_GRAY, 16}},
+                           {ZQ_TYPE_RGB, {PNG_COLOR_TYPE_RGB, 8}},
+                           {ZQ_TYPE_RGBU64, {PNG_COLOR_TYPE_RGB, 16}}};
 
-const Kind& kind_of(const benchmark::State& state) {
-    return kKinds[state.range(0)];
-}
-
-void paint(const Image& image, const Kind& kind) {
-    if (const char* path = std::getenv(kind.samples)) {
-        const File file = open(path, "rb");
-        for (int32_t y = 0; y < kHeight; ++y) {
-            const size_t bytes = image.row_bytes();
-            check(std::fread(image.row(y), 1, bytes, file.get()) == bytes, "samples");
-        }
-        return;
-    }
-    uint32_t random = 1;
-    const int channels = kind.colour_type == PNG_COLOR_TYPE_GRAY ? 1 : 4;
-    for (int32_t y = 0; y < kHeight; ++y) {
-        if (kind.depth == 8) {
-            zqbench::paint_row(image.row(y), kWidth, y, channels, 1, random);
-        } else {
-            zqbench::paint_row(reinterpret_cast<uint16_t*>(image.row(y)), kWidth, y, channels, 13,
-                               random);
-        }
-    }
-}
-
-struct Paths {
-    std::string ours = name("ours.png"), bare = name("bare.png");
-    ~Paths() {
-        std::filesystem::remove(ours);
-        std::filesystem::remove(bare);
-    }
-    static std::string name(const char* which) {
-        return (std::filesystem::temp_directory_path() / "zqbench-").string() + which;
-    }
+// What one of these files holds, and the types that its samples come from and that it is read into.
+struct Variant {
+    const char* name;
+    int32_t type;
+    PngShape shape;
+    int32_t read_type = type;
 };
 
-void write_file(const std::string& path, const Image& image, int32_t setting) {
-    const ZqWriteOptions options = {1, {setting, 0, 0}};
-    check(ZqWriteFileByCode(path.c_str(), image.handle(), &options, 4, nullptr) == 0, "write");
-}
-
-void read_file(const std::string& path, const Image& image) {
-    check(ZqReadFile(image.handle(), path.c_str(), nullptr, nullptr, nullptr, nullptr) == 0,
-          "read");
-}
-
-void bare_write(const std::string& path, const Image& image, const Kind& kind, int level,
-                int filters) {
-    const File file = open(path, "wb");
-    png_structp png = png_create_write_struct(PNG_LIBPNG_VER_STRING, nullptr, nullptr, nullptr);
-    png_infop info = png_create_info_struct(png);
-    png_init_io(png, file.get());
-    png_set_IHDR(png, info, kWidth, kHeight, kind.depth, kind.colour_type, PNG_INTERLACE_NONE,
-                 PNG_COMPRESSION_TYPE_DEFAULT, PNG_FILTER_TYPE_DEFAULT);
-    png_set_compression_level(png, level);
-    png_set_filter(png, PNG_FILTER_TYPE_BASE, filters);
-    png_write_info(png, info);
-    if (kind.depth == 16) png_set_swap(png);
-    if (kind.colour_type == PNG_COLOR_TYPE_RGB) {
-        png_set_bgr(png);
-        png_set_filler(png, 0, PNG_FILLER_AFTER);
-    }
-    for (int32_t y = 0; y < kHeight; ++y) png_write_row(png, image.row(y));
-    png_write_end(png, info);
-    png_destroy_write_struct(&png, &info);
-}
-
-// Into rows of the same layout, which are made anew as an image's are.
-void bare_read(const std::string& path) {
-    const File file = open(path, "rb");
-    png_structp png = png_create_read_struct(PNG_LIBPNG_VER_STRING, nullptr, nullptr, nullptr);
-    png_infop info = png_create_info_struct(png);
-    png_init_io(png, file.get());
-    png_read_info(png, info);
-    if (png_get_bit_depth(png, info) == 16) png_set_swap(png);
-    if (png_get_color_type(png, info) == PNG_COLOR_TYPE_RGB) {
-        png_set_filler(png, 0, PNG_FILLER_AFTER);
-        png_set_bgr(png);
-    }
-    png_read_update_info(png, info);
-    const size_t stride = png_get_rowbytes(png, info);
-    const std::unique_ptr<uint8_t[]> pixels(new uint8_t[stride * kHeight]);
-    for (int32_t y = 0; y < kHeight; ++y) {
-        png_read_row(png, pixels.get() + stride * static_cast<size_t>(y), nullptr);
-    }
-    png_read_end(png, nullptr);
-    png_destroy_read_struct(&png, &info, nullptr);
-}
+constexpr Variant kVariants[] = {
+    {"1-bit grey", ZQ_TYPE_U8, {PNG_COLOR_TYPE_GRAY, 1}},
+    {"2-bit grey", ZQ_TYPE_U8, {PNG_COLOR_TYPE_GRAY, 2}},
+    {"4-bit grey", ZQ_TYPE_U8, {PNG_COLOR_TYPE_GRAY, 4}},
+    {"1-bit indices", ZQ_TYPE_U8, {PNG_COLOR_TYPE_PALETTE, 1}},
+    {"2-bit indices", ZQ_TYPE_U8, {PNG_COLOR_TYPE_PALETTE, 2}},
+    {"4-bit indices", ZQ_TYPE_U8, {PNG_COLOR_TYPE_PALETTE, 4}},
+    {"indices", ZQ_TYPE_U8, {PNG_COLOR_TYPE_PALETTE, 8}},
+    {"grey and alpha", ZQ_TYPE_I16, {PNG_COLOR_TYPE_GRAY_ALPHA, 8}, ZQ_TYPE_RGB},
+    {"RGB and alpha", ZQ_TYPE_RGB, {PNG_COLOR_TYPE_RGB_ALPHA, 8}},
+    {"16-bit RGB and alpha", ZQ_TYPE_RGBU64, {PNG_COLOR_TYPE_RGB_ALPHA, 16}},
+    {"interlaced grey", ZQ_TYPE_U8, {PNG_COLOR_TYPE_GRAY, 8, true}},
+    {"interlaced 16-bit grey", ZQ_TYPE_I16, {PNG_COLOR_TYPE_GRAY, 16, true}},
+    {"interlaced RGB", ZQ_TYPE_RGB, {PNG_COLOR_TYPE_RGB, 8, true}},
+    {"interlaced 4-bit indices", ZQ_TYPE_U8, {PNG_COLOR_TYPE_PALETTE, 4, true}}};
 
 // Strengths as in the compression setting 100 - s: level s / 10, and one filter or all.
-int filters_of(int strength) {
+zqbench::PngStrength strength_of(int strength) {
     constexpr int kFilters[] = {PNG_FILTER_NONE, PNG_FILTER_SUB, PNG_FILTER_UP, PNG_FILTER_AVG,
                                 PNG_FILTER_PAETH};
-    return strength % 10 < 5 ? kFilters[strength % 10] : PNG_ALL_FILTERS;
+    return {strength / 10, strength % 10 < 5 ? kFilters[strength % 10] : PNG_ALL_FILTERS};
 }
 
-double megabytes(size_t bytes) {
-    return static_cast<double>(bytes) / (1 << 20);
-}
+constexpr int kUsualStrength = 66;
 
 void PngWrite(benchmark::State& state) {
-    const Kind& kind = kind_of(state);
+    const Kind& kind = kKinds[state.range(0)];
     const auto strength = static_cast<int>(state.range(1));
-    const Image image(kind.type, kWidth, kHeight);
-    paint(image, kind);
-    const Paths paths;
-    const auto ours = [&] { write_file(paths.ours, image, 100 - strength); };
-    const size_t growth = zqbench::peak_growth(ours);
-    zqbench::run_paired(state, ours, [&] {
-        bare_write(paths.bare, image, kind, strength / 10, filters_of(strength));
-    });
-    const auto bytes = static_cast<double>(std::filesystem::file_size(paths.ours));
-    state.counters["size_ratio"] =
-        bytes / static_cast<double>(std::filesystem::file_size(paths.bare));
-    state.counters["MiB_beside"] = megabytes(growth);
+    const zqbench::Photograph image(kind.type);
+    const FilePaths paths(".png");
+    const bool usual = strength == kUsualStrength;
+    zqbench::compare_write(
+        state, paths.ours,
+        [&] {
+            zqbench::write_file(paths.ours, image, kPng, {1, {100 - strength, 0, 0}});
+        },
+        {{"libpng", paths.bare,
+          [&] { bare_png_write(paths.bare, image, kind.shape, strength_of(strength)); }},
+         {"OpenCV", paths.opencv,
+          usual ? zqbench::opencv_write(paths.opencv, zqbench::pixels_of(image), "PNG")
+                : zqbench::Job()}});
+}
+
+void compare_reads(benchmark::State& state, int32_t type, const PngShape& shape,
+                   int32_t read_type) {
+    const zqbench::Photograph image(type);
+    const Image copy(read_type);
+    const FilePaths paths(".png");
+    bare_png_write(paths.bare, image, shape);
+    zqbench::compare_read(state, paths.bare, read_type,
+                          {{"libpng", [&] { bare_png_read(paths.bare); }},
+                           {"OpenCV", zqbench::opencv_read(paths.bare)}});
+    zqbench::read_file(paths.bare, copy);
+    zqbench::check_same(copy, bare_png_read(paths.bare));
 }
 
 void PngRead(benchmark::State& state) {
-    const Kind& kind = kind_of(state);
-    const Image image(kind.type, kWidth, kHeight), target(kind.type, kWidth, kHeight);
-    paint(image, kind);
-    const Paths paths;
-    bare_write(paths.bare, image, kind, 6, PNG_ALL_FILTERS);
-    const size_t growth = zqbench::peak_growth([&] { read_file(paths.bare, Image(kind.type)); });
-    zqbench::run_paired(
-        state, [&] { read_file(paths.bare, Image(kind.type)); }, [&] { bare_read(paths.bare); });
-    // The image made by the read is not beside the picture.
-    state.counters["MiB_beside"] =
-        megabytes(growth) - megabytes(image.row_bytes() * size_t{kHeight});
-    read_file(paths.bare, target);
-    for (int32_t y = 0; y < kHeight; ++y) {
-        check(std::memcmp(image.row(y), target.row(y), image.row_bytes()) == 0, "same pixels");
+    const Kind& kind = kKinds[state.range(0)];
+    compare_reads(state, kind.type, kind.shape, kind.type);
+}
+
+void PngVariantRead(benchmark::State& state) {
+    const Variant& variant = kVariants[state.range(0)];
+    compare_reads(state, variant.type, variant.shape, variant.read_type);
+    state.SetLabel(variant.name);
+}
+
+// A calibrated picture with an experiment's notes: 16 values of 4 KiB. Its files are compared with
+// such without them: ours, and libpng's.
+class Experiment : public zqbench::Photograph {
+  public:
+    explicit Experiment(const Kind& kind) : Photograph(kind.type) {
+        handle()->unit = 3;
+        handle()->xStep = handle()->yStep = 0.25F;
+        const ZqImageValue to = value();
+        std::string notes(4096, 'a');
+        for (char key = 'a'; key < 'a' + 16; ++key) {
+            const char name[] = {key, '\0'};
+            for (size_t i = 0; i < notes.size(); ++i)
+                notes[i] = static_cast<char>(i * i / 7 + static_cast<size_t>(key));
+            check(DF_WriteCustomData(&to, name, notes.data(), static_cast<uint32_t>(notes.size()),
+                                     nullptr) == 0,
+                  "custom data");
+        }
     }
+
+    void write() const {
+        const ZqImageValue from = value();
+        check(DF_WriteImageAndVisionInfo(&from, paths.ours.c_str(), nullptr, nullptr) == 0,
+              "write");
+    }
+    void read(const Image& target) const {
+        const ZqImageValue to = target.value();
+        check(DF_ReadImageAndVisionInfo(&to, paths.ours.c_str(), 0, nullptr, nullptr) == 0, "read");
+    }
+
+    FilePaths paths{".png"}, plain{"-plain.png"};
+};
+
+void PngVisionWrite(benchmark::State& state) {
+    const Kind& kind = kKinds[state.range(0)];
+    const Experiment image(kind);
+    const FilePaths& paths = image.paths;
+    zqbench::compare_write(
+        state, paths.ours, [&] { image.write(); },
+        {{"plain", image.plain.ours, [&] { zqbench::write_file(image.plain.ours, image, kPng); }},
+         {"libpng", paths.bare, [&] { bare_png_write(paths.bare, image, kind.shape); }}});
+}
+
+void PngVisionRead(benchmark::State& state) {
+    const Kind& kind = kKinds[state.range(0)];
+    const Experiment image(kind);
+    const Image copy(kind.type);
+    image.write();
+    zqbench::write_file(image.plain.ours, image, kPng);
+    zqbench::compare_read(
+        state, kind.type, [&](const Image& target) { image.read(target); },
+        {{"plain", [&] { zqbench::read_file(image.plain.ours, Image(kind.type)); }},
+         {"libpng", [&] { bare_png_read(image.paths.ours); }}});
+    image.read(copy);
+    zqbench::check_same(image, copy);
+    const ZqImageValue value = copy.value();
+    check(copy.handle()->unit == 3 && DF_RemoveCustomData(&value, "p", nullptr) == 0, "the notes");
 }
 
 BENCHMARK(PngWrite)
     ->ArgNames({"kind", "strength"})
-    ->ArgsProduct({{0, 1, 2, 3}, {0, 11, 24, 30, 46, 60, 66, 96}})
+    ->ArgsProduct({{0, 1, 2, 3}, {0, 11, 24, 30, 46, 60, kUsualStrength, 96}})
     ->UseManualTime()
     ->Unit(benchmark::kMillisecond)
     ->Iterations(1);
-BENCHMARK(PngRead)
+BENCHMARK(PngRead)->ArgName("kind")->DenseRange(0, 3)->Apply(zqbench::timed_file);
+BENCHMARK(PngVariantRead)->DenseRange(0, std::ssize(kVariants) - 1)->Apply(zqbench::timed_file);
+BENCHMARK(PngVisionWrite)
     ->ArgName("kind")
     ->DenseRange(0, 3)
-    ->UseManualTime()
-    ->Unit(benchmark::kMillisecond)
-    ->Iterations(5);
+    ->Apply(zqbench::timed_file)
+    ->Iterations(3);
+BENCHMARK(PngVisionRead)->ArgName("kind")->DenseRange(0, 3)->Apply(zqbench::timed_file);
 
 }  // namespace

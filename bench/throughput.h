@@ -22,7 +22,8 @@ inline constexpr std::size_t kPixels = std::size_t{kWidth} * kHeight;
 
 struct Baseline {
     std::string name;
-    Job job;  // empty: cannot be run here
+    Job job;          // empty: cannot be run here
+    Job before = {};  // each time, and not timed
 };
 
 inline Baseline memcpy_named(std::string name, std::size_t bytes) {
@@ -39,9 +40,11 @@ inline Baseline memcpy_of(std::size_t bytes_per_pixel) {
     return memcpy_named("memcpy", kPixels * bytes_per_pixel / 2);
 }
 
-// Reports megapixels a second, and how many times the throughput of each baseline that is.
+// Reports megapixels a second, and how many times the throughput of each baseline that is: by the
+// time that passed and, as "cpu x", by the processor's, which other programs disturb less.
 inline void run_compared(benchmark::State& state, const Job& ours,
-                         const std::vector<Baseline>& baselines, std::size_t pixels = kPixels) {
+                         const std::vector<Baseline>& baselines, std::size_t pixels = kPixels,
+                         const Job& before_ours = {}) {
     ours();
     Times our_times;
     std::vector<std::pair<const Baseline*, Times>> others;
@@ -51,14 +54,20 @@ inline void run_compared(benchmark::State& state, const Job& ours,
         others.emplace_back(&baseline, Times());
     }
     for (auto step : state) {
+        if (before_ours) before_ours();
         our_times.add(ours);
-        for (auto& [baseline, times] : others) times.add(baseline->job);
+        for (auto& [baseline, times] : others) {
+            if (baseline->before) baseline->before();
+            times.add(baseline->job);
+        }
         state.SetIterationTime(our_times.wall.back());
     }
     const double seconds = median(our_times.wall);
     state.counters["Mpixel/s"] = static_cast<double>(pixels) / seconds * 1e-6;
     for (auto& [baseline, times] : others) {
         state.counters["x " + baseline->name] = median(times.wall) / seconds;
+        state.counters["cpu x " + baseline->name] =
+            median(times.processor) / median(our_times.processor);
     }
 }
 

@@ -6,7 +6,7 @@ set -euo pipefail
 . scripts/common.sh
 target=native
 case ${1:-} in native | win64 | win32) target=$1; shift ;; esac
-[[ $target != native ]] || need libopencv-imgproc-dev
+[[ $target != native ]] || need libopencv-imgcodecs-dev libopencv-imgproc-dev
 build_preset "$target" zqvis_bench zqvis_codec_bench
 [[ $target != win32 ]] || win32_setup
 say "benchmarks ($target)"

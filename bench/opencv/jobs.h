@@ -2,7 +2,9 @@
 // every job is empty.
 #pragma once
 
+#include <cstddef>
 #include <functional>
+#include <string>
 #include <string_view>
 
 namespace zqbench {
@@ -14,5 +16,19 @@ using Job = std::function<void()>;
 Job opencv_conversion(std::string_view name);
 Job opencv_colour_model(std::string_view name);
 Job opencv_bayer(std::string_view name);
+
+// Pixels of an image of ours: a grey sample, or blue, green, red and a filler.
+struct Pixels {
+    const void* first;
+    std::size_t stride;  // bytes
+    int width, height;
+    bool colour;
+    int bits;
+};
+
+// Files; what there is to write is copied first. `settings` names a format and its options as our
+// files have them, and the path's extension is the format's. A read throws its pixels away.
+Job opencv_write(const std::string& path, const Pixels& pixels, std::string_view settings);
+Job opencv_read(const std::string& path);
 
 }  // namespace zqbench
