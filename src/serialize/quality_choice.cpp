@@ -5,6 +5,7 @@
 #include <cmath>
 #include <cstdlib>
 #include <cstring>
+#include <limits>
 
 #include "serialize/quality_payload.h"
 #include "serialize/quality_seam.h"
@@ -29,7 +30,10 @@ constexpr SampleShape kWaveletSample = {256, 256, 1};
 constexpr std::int32_t kBlock = 8;  // JPEG blocks come out the same wherever they stand
 
 // How far back lower qualities are tried: `least_back`, and farther while the error does not fall
-// as evenly as it does in photographs, until it is `far` times the best.
+// as evenly as it does in photographs: to the lowest in small images, where colours that clip may
+// make some low quality exact; else up to kMostBack, until the error is `far` times the best.
+constexpr std::int64_t kMostSearched = std::int64_t{1} << 15;
+constexpr int kQualities = 100;
 constexpr int kMostBack = 32;
 struct Evenness {
     double least_ratio, most_ratio;  // from one quality to the next
@@ -38,6 +42,8 @@ struct Evenness {
 };
 constexpr Evenness kJpeg = {1, 1.3, 2, 2};
 constexpr Evenness kWavelets = {1.015, 1.12, 8, 4};
+// Where the lowest quality comes nearer than that, nothing can be relied on.
+constexpr double kSurelyWorse = 1.5;
 // What a sample says of the whole is not exact.
 constexpr double kSampleMargin = 0.98;
 
@@ -218,12 +224,18 @@ QualityChoice choose_quality(const Image& image, int quality) {
     // Steps of JPEG divide so that large pictures do not get worse.
     if (is_jpeg && !sample.is_whole()) return trials.take();
     const Evenness& limits = is_jpeg ? kJpeg : kWavelets;
+    const bool to_the_lowest = pixels_of(image) <= kMostSearched;
+    const int most_back = std::min(quality - 1, to_the_lowest ? kQualities : kMostBack);
+    const double far = to_the_lowest ? std::numeric_limits<double>::infinity() : limits.far;
     bool is_even = true;
-    for (int back = 1; back <= kMostBack && back < quality && trials.best_total() > 0; ++back) {
+    if (to_the_lowest && quality > 1) {
+        is_even = trials.attempt(1) > kSurelyWorse * trials.best_total();
+    }
+    for (int back = 1; back <= most_back && trials.best_total() > 0; ++back) {
         const double total = trials.attempt(quality - back);
         is_even =
             is_even && total > limits.least_ratio * above && total < limits.most_ratio * above;
-        if (is_even ? back >= limits.least_back : total > limits.far * trials.best_total()) break;
+        if (is_even ? back >= limits.least_back : total > far * trials.best_total()) break;
         above = total;
     }
     return trials.take();
