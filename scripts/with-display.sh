@@ -8,6 +8,8 @@
 set -euo pipefail
 [[ $1 != *run-win32.sh ]] || exec "$@"
 
+# Of the server that is stopped at the end, too: the other prefix may be in use.
+export WINEPREFIX=$ZQVISSVC_WINE_DISPLAY_PREFIX
 display_pid=
 folder=$(mktemp -d)
 clean_up() {
@@ -25,4 +27,4 @@ for ((i = 0; i < 600; ++i)); do
     sleep 0.1
 done
 [[ -s $folder/display ]] || { cat "$folder/log" >&2; exit 1; }
-DISPLAY=:$(cat "$folder/display") WINEPREFIX=$ZQVISSVC_WINE_DISPLAY_PREFIX "$@"
+DISPLAY=:$(cat "$folder/display") "$@"
