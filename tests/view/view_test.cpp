@@ -7,6 +7,8 @@
 
 #include <cstring>
 #include <filesystem>
+#include <fstream>
+#include <string>
 #include <vector>
 
 #include "document.h"
@@ -128,6 +130,21 @@ TEST(Folder, IsWalkedByNames) {
     }
     const std::string nowhere = folder.path("nowhere") + "/a.png";
     EXPECT_EQ(neighbour(nowhere, 1), nowhere);
+}
+
+TEST(Folder, HoldsNamesInEveryScript) {
+    const zqtest::ScratchFolder folder;
+    const std::string inside = folder.path("") + "\xC3\xA4rger/";  // UTF-8, as all that follow
+    const auto path_of = [&](const std::string& name) {
+        const std::string path = inside + name;
+        return std::filesystem::path(std::u8string(path.begin(), path.end()));
+    };
+    const std::vector<std::string> names = {"a.png", "\xC3\xB6l.png", "\xE6\xBC\xA2.png"};
+    std::filesystem::create_directory(path_of(""));
+    for (const std::string& name : names) std::ofstream(path_of(name)) << 'P';
+    const std::string second = neighbour(inside + names[0], 1);
+    EXPECT_EQ(name_of(second), names[1]);
+    EXPECT_EQ(name_of(neighbour(second, 1)), names[2]);
 }
 
 TEST(Document, TellsValuesByTheirComponents) {

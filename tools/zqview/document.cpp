@@ -5,7 +5,6 @@
 #include <zqvissvc/image.h>
 
 #include <cstring>
-#include <filesystem>
 
 #include "failure.h"
 
@@ -49,7 +48,7 @@ std::string value_text(int32_t type, const uint8_t* pixel) {
 }  // namespace
 
 std::string name_of(const std::string& path) {
-    return std::filesystem::path(path).filename().string();
+    return path.substr(path.find_last_of("/\\") + 1);
 }
 
 Document::Document(std::string path)

@@ -11,6 +11,25 @@ namespace fs = std::filesystem;
 
 namespace {
 
+// Names are UTF-8 everywhere; of plain characters the standard library would think otherwise.
+fs::path path_of(const std::string& text) {
+    return {std::u8string(text.begin(), text.end())};
+}
+
+std::string text_of(const fs::path& path) {
+    const std::u8string text = path.u8string();
+    return {text.begin(), text.end()};
+}
+
+// A name that is no text is no image's: nothing here could open it.
+bool names_image(const fs::path& name) {
+    try {
+        return format_of_path(text_of(name)) != nullptr;
+    } catch (const fs::filesystem_error&) {
+        return false;
+    }
+}
+
 std::vector<fs::path> images_beside(const fs::path& file) {
     const fs::path folder = file.has_parent_path() ? file.parent_path() : fs::path(".");
     std::vector<fs::path> names;
@@ -19,9 +38,7 @@ std::vector<fs::path> images_beside(const fs::path& file) {
          entry.increment(error)) {
         std::error_code unreadable;
         const fs::path name = entry->path().filename();
-        if (format_of_path(name.string()) != nullptr && entry->is_regular_file(unreadable)) {
-            names.push_back(name);
-        }
+        if (names_image(name) && entry->is_regular_file(unreadable)) names.push_back(name);
     }
     std::ranges::sort(names);
     return names;
@@ -30,7 +47,7 @@ std::vector<fs::path> images_beside(const fs::path& file) {
 }  // namespace
 
 std::string neighbour(const std::string& file, int steps) {
-    const fs::path path(file);
+    const fs::path path = path_of(file);
     const std::vector<fs::path> names = images_beside(path);
     if (names.empty() || steps == 0) return file;
     const auto here = std::ranges::lower_bound(names, path.filename());
@@ -38,5 +55,5 @@ std::string neighbour(const std::string& file, int steps) {
     // A file that is not among them stands between its neighbours.
     if (steps > 0 && (here == names.end() || *here != path.filename())) --index;
     index = std::clamp<std::ptrdiff_t>(index, 0, std::ssize(names) - 1);
-    return (path.parent_path() / names[static_cast<size_t>(index)]).string();
+    return text_of(path.parent_path() / names[static_cast<size_t>(index)]);
 }
