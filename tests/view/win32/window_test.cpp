@@ -252,6 +252,10 @@ TEST_F(Window, ShowsZoomsScrollsAndWalks) {
     press(VK_RIGHT);
     expect_title("b.png - 1500 x 1400, RGB - 1:2 - zqview");
     expect_picture("shrunk", large_.handle(), -2, 0, 0);
+    // Where the pointer was left, from the middle, at which both pictures are.
+    const uint8_t* pixel = &large_.at<uint8_t>(570, 560);
+    expect_status("(570, 560)  red " + std::to_string(pixel[2]) + ", green " +
+                  std::to_string(pixel[1]) + ", blue " + std::to_string(pixel[0]));
     press(VK_RIGHT);
     expect_title("c.png - zqview");
     expect_status("File I/O error.");

@@ -91,10 +91,8 @@ void Viewer::open(const std::string& path) {
         failure_ = message_of(ZQ_ERR_NOT_ENOUGH_MEMORY);
     }
     path_ = path;
-    area_->show(opened.get());
-    document_ = std::move(opened);
-    show_title();
-    show_status(std::nullopt);
+    document_.swap(opened);  // the area may use the one before until it is told
+    area_->show(document_.get());
 }
 
 void Viewer::show_title() {
