@@ -1,5 +1,6 @@
 // Windows whose messages an object handles: T::adopt(HWND) is called when the window is made with
-// the object as its creation parameter, T::handle(message, wide, word) for all that follows.
+// the object as its creation parameter, T::handle(message, wide, word) for all that follows. The
+// object must outlive the window.
 #ifndef ZQVIEW_WINDOW_PROCEDURE_H
 #define ZQVIEW_WINDOW_PROCEDURE_H
 
@@ -13,8 +14,13 @@ LRESULT CALLBACK window_procedure(HWND window, UINT message, WPARAM wide, LPARAM
         SetWindowLongPtrA(window, GWLP_USERDATA, reinterpret_cast<LONG_PTR>(made->lpCreateParams));
     }
     auto* object = reinterpret_cast<T*>(GetWindowLongPtrA(window, GWLP_USERDATA));
-    return object != nullptr ? object->handle(message, wide, word)
-                             : DefWindowProcA(window, message, wide, word);
+    try {
+        if (object != nullptr) return object->handle(message, wide, word);
+    } catch (...) {
+        // The system cannot be thrown through: what failed for want of memory has no effect.
+        if (message == WM_CREATE) return -1;
+    }
+    return DefWindowProcA(window, message, wide, word);
 }
 
 #endif
