@@ -53,9 +53,9 @@ LRESULT PictureArea::handle(UINT message, WPARAM wide, LPARAM word) {
             InvalidateRect(window_, nullptr, FALSE);
             return 0;
         case WM_LBUTTONDOWN:
+            move_pointer(client_point(word));
             dragging_ = true;
             SetCapture(window_);
-            move_pointer(client_point(word));
             return 0;
         case WM_LBUTTONUP:
             move_pointer(client_point(word));
