@@ -132,6 +132,17 @@ void read_masks(InputFile& file, Raw& raw, BmpHeader& header) {
     check_masks(header);
 }
 
+// Some writers forget the palette in the offset of the pixels, others write none: whether both fit
+// into the file.
+bool has_room_for(std::uint32_t palette, const InputFile& file, const Raw& raw,
+                  const BmpHeader& header) {
+    if (file.size() == InputFile::kUnknownSize) return true;
+    const std::uint64_t pixels =
+        header.is_rle() ? header.data_bytes
+                        : header.line_bytes() * static_cast<std::uint64_t>(header.height);
+    return static_cast<std::uint64_t>(file.size()) >= raw.end + palette + pixels;
+}
+
 // A palette ends where the pixels begin, and has no more entries than there are indices.
 void read_palette(InputFile& file, const Raw& raw, BmpHeader& header) {
     const bool core = raw.size == kCoreHeaderBytes;
@@ -140,9 +151,10 @@ void read_palette(InputFile& file, const Raw& raw, BmpHeader& header) {
     const std::uint32_t full = indexed ? 1U << header.bits_per_pixel : 0;
     const std::uint32_t said = core ? 0 : raw.word(kPaletteEntries);
     std::uint32_t count = said == 0 ? full : std::min(said, full);
-    // Some writers leave the offset out, or forget the palette in it.
-    const bool forgotten = header.data_offset == 0 || (indexed && header.data_offset == raw.end);
-    if (forgotten) header.data_offset = raw.end + count * entry;
+    if (header.data_offset == 0 || (indexed && header.data_offset == raw.end &&
+                                    has_room_for(count * entry, file, raw, header))) {
+        header.data_offset = raw.end + count * entry;
+    }
     if (header.data_offset < raw.end) throw kInvalidFileHeader;
     count = std::min(count, (header.data_offset - raw.end) / entry);
 

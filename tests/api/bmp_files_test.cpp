@@ -261,6 +261,10 @@ TEST_F(BmpFilesTest, PixelsFollowThePaletteWhenTheOffsetForgetsIt) {
         ASSERT_EQ(read(good.bytes().replace(10, 4, le(offset)), picture), 0);
         EXPECT_EQ(picture.pixels(), "defabc") << offset;
     }
+    const Bmp none = {.width = 3, .height = 2, .data = "abc.def."};
+    Picture picture(ZQ_TYPE_U8);
+    ASSERT_EQ(read(none.bytes(), picture), 0);
+    EXPECT_EQ(picture.pixels(), "defabc");
 }
 
 TEST_F(BmpFilesTest, RefusesWrongFieldsAndKeepsTheImage) {

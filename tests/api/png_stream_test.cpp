@@ -11,7 +11,6 @@
 
 namespace {
 
-using zqtest::load_bytes;
 using zqtest::Picture;
 using zqtest::png_chunk;
 using zqtest::store_bytes;

@@ -48,7 +48,9 @@ struct Field {
             }
         }
     }
-    float& at(int x, int y) { return samples[static_cast<std::size_t>(y * kStride + x)]; }
+    float& at(int x, int y) {
+        return samples[static_cast<std::size_t>(y) * kStride + static_cast<std::size_t>(x)];
+    }
 };
 
 TEST(WaveletTest, EverySizeIsRestored) {

@@ -18,6 +18,7 @@ pid_t start_batch(const ToolFolder& folder, const std::string& output, int count
     for (const char* word : {"--format", "JPEG2000", "--quiet", "--out-dir"}) words.push_back(word);
     words.push_back(output);
     std::vector<char*> arguments;
+    arguments.reserve(words.size() + 1);
     for (std::string& word : words) arguments.push_back(word.data());
     arguments.push_back(nullptr);
     const pid_t child = fork();
