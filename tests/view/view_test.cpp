@@ -34,6 +34,10 @@ TEST(View, FitsWhatIsTooLarge) {
         view.show(c.image);
         EXPECT_EQ(view.zoom_text(), c.zoom) << c.image.width << " x " << c.image.height;
         EXPECT_EQ(view.offset(), (Point{0, 0}));
+        View made_later;
+        made_later.show(c.image);
+        made_later.resize(c.client);
+        EXPECT_EQ(made_later.zoom_text(), c.zoom);
     }
 }
 

@@ -43,6 +43,10 @@ int64_t origin(int32_t side, int32_t zoom, int32_t client, int32_t offset) {
     return size < client ? (client - size) / 2 : -int64_t{offset};
 }
 
+bool is_empty(Extent extent) {
+    return extent.width < 1 || extent.height < 1;
+}
+
 int32_t clamped(int64_t offset, int32_t side, int32_t zoom, int32_t client) {
     const int64_t most = std::clamp<int64_t>(scaled(side, zoom) - client, 0, INT32_MAX);
     return static_cast<int32_t>(std::clamp<int64_t>(offset, 0, most));
@@ -57,7 +61,9 @@ void View::show(Extent image) {
 }
 
 void View::resize(Extent client) {
+    const bool was_empty = is_empty(client_);
     client_ = client;
+    if (was_empty) fit();
     clamp_offset();
 }
 
@@ -85,8 +91,8 @@ void View::zoom_to(int32_t zoom, Point about) {
 void View::fit() {
     zoom_ = 1;
     const auto fits = [&] {
-        return scaled(image_.width, zoom_) <= client_.width &&
-               scaled(image_.height, zoom_) <= client_.height;
+        return is_empty(client_) || (scaled(image_.width, zoom_) <= client_.width &&
+                                     scaled(image_.height, zoom_) <= client_.height);
     };
     while (!fits() && steps_of(zoom_) > -kMostSteps) zoom_ = zoom_of(steps_of(zoom_) - 1);
     offset_ = {0, 0};

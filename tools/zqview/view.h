@@ -20,6 +20,7 @@ class View {
   public:
     // Another image: one of the same size keeps zoom and place, any other is fitted.
     void show(Extent image);
+    // The first that is not empty fits the image.
     void resize(Extent client);
 
     // 1 to 16 enlarges, -2 to -16 shrinks.

@@ -22,11 +22,13 @@ int main(int argc, char** argv) {
         MessageBoxA(nullptr, kUsage, "zqview", MB_OK);
         return argc > 2 ? 2 : 0;
     }
-    int status = 0;
+    int status = 1;
     {
         Viewer viewer;
-        if (argc == 2) viewer.open(argv[1]);
-        status = viewer.run();
+        if (viewer.is_made()) {
+            if (argc == 2) viewer.open(argv[1]);
+            status = viewer.run();
+        }
     }
     refhost::run_cleanup();
     return status;

@@ -31,8 +31,9 @@ Viewer::Viewer() {
     description.hCursor = LoadCursorA(nullptr, reinterpret_cast<LPCSTR>(IDC_ARROW));
     description.lpszClassName = kClass;
     RegisterClassA(&description);
-    CreateWindowExA(WS_EX_ACCEPTFILES, kClass, kName, WS_OVERLAPPEDWINDOW, CW_USEDEFAULT,
-                    CW_USEDEFAULT, kWidth, kHeight, nullptr, nullptr, description.hInstance, this);
+    window_ = CreateWindowExA(WS_EX_ACCEPTFILES, kClass, kName, WS_OVERLAPPEDWINDOW, CW_USEDEFAULT,
+                              CW_USEDEFAULT, kWidth, kHeight, nullptr, nullptr,
+                              description.hInstance, this);
     ShowWindow(window_, SW_SHOWDEFAULT);
 }
 
@@ -42,7 +43,7 @@ LRESULT Viewer::handle(UINT message, WPARAM wide, LPARAM word) {
             create_parts();
             return 0;
         case WM_SIZE:
-            arrange();
+            if (wide != SIZE_MINIMIZED) arrange();
             return 0;
         case WM_KEYDOWN:
             if (press(wide)) return 0;

@@ -19,6 +19,8 @@ class Viewer {
     Viewer(const Viewer&) = delete;
     Viewer& operator=(const Viewer&) = delete;
 
+    // Whether the system made the window; nothing else works without.
+    bool is_made() const { return window_ != nullptr; }
     // Shows a file, or says why it cannot be shown.
     void open(const std::string& path);
     // Handles messages until the window is closed; returns the exit status.
