@@ -33,7 +33,6 @@ constexpr std::int32_t kBlock = 8;  // JPEG blocks come out the same wherever th
 // as evenly as it does in photographs: to the lowest in small images, where colours that clip may
 // make some low quality exact; else up to kMostBack, until the error is `far` times the best.
 constexpr std::int64_t kMostSearched = std::int64_t{1} << 15;
-constexpr int kQualities = 100;
 constexpr int kMostBack = 32;
 struct Evenness {
     double least_ratio, most_ratio;  // from one quality to the next
@@ -225,7 +224,8 @@ QualityChoice choose_quality(const Image& image, int quality) {
     if (is_jpeg && !sample.is_whole()) return trials.take();
     const Evenness& limits = is_jpeg ? kJpeg : kWavelets;
     const bool to_the_lowest = pixels_of(image) <= kMostSearched;
-    const int most_back = std::min(quality - 1, to_the_lowest ? kQualities : kMostBack);
+    // The lowest is tried first there.
+    const int most_back = to_the_lowest ? quality - 2 : std::min(quality - 1, kMostBack);
     const double far = to_the_lowest ? std::numeric_limits<double>::infinity() : limits.far;
     bool is_even = true;
     if (to_the_lowest && quality > 1) {
