@@ -13,17 +13,6 @@ namespace {
 
 constexpr char kClass[] = "ZqViewPicture";
 
-// A context of its own keeps the mapping of the last drawing, by which positions are told.
-void register_class(WNDPROC procedure) {
-    WNDCLASSA description{};
-    description.style = CS_OWNDC;
-    description.lpfnWndProc = procedure;
-    description.hInstance = GetModuleHandleA(nullptr);
-    description.hCursor = LoadCursorA(nullptr, reinterpret_cast<LPCSTR>(IDC_CROSS));
-    description.lpszClassName = kClass;
-    RegisterClassA(&description);  // a second time fails, harmlessly
-}
-
 Point client_point(LPARAM word) {
     return {GET_X_LPARAM(word), GET_Y_LPARAM(word)};
 }
@@ -36,7 +25,8 @@ int32_t rounded_down(int32_t value, int32_t multiple) {
 }  // namespace
 
 PictureArea::PictureArea(HWND parent, Events events) : events_(std::move(events)) {
-    register_class(&window_procedure<PictureArea>);
+    // A context of its own keeps the mapping of the last drawing, by which positions are told.
+    register_window_class<PictureArea>(kClass, CS_OWNDC, IDC_CROSS);
     window_ = CreateWindowExA(0, kClass, "", WS_CHILD | WS_VISIBLE, 0, 0, 0, 0, parent, nullptr,
                               GetModuleHandleA(nullptr), this);
 }

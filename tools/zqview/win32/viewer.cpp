@@ -25,15 +25,10 @@ constexpr int kToTheEnd = INT_MAX / 2;
 }  // namespace
 
 Viewer::Viewer() {
-    WNDCLASSA description{};
-    description.lpfnWndProc = &window_procedure<Viewer>;
-    description.hInstance = GetModuleHandleA(nullptr);
-    description.hCursor = LoadCursorA(nullptr, reinterpret_cast<LPCSTR>(IDC_ARROW));
-    description.lpszClassName = kClass;
-    RegisterClassA(&description);
+    register_window_class<Viewer>(kClass, 0, IDC_ARROW);
     window_ = CreateWindowExA(WS_EX_ACCEPTFILES, kClass, kName, WS_OVERLAPPEDWINDOW, CW_USEDEFAULT,
                               CW_USEDEFAULT, kWidth, kHeight, nullptr, nullptr,
-                              description.hInstance, this);
+                              GetModuleHandleA(nullptr), this);
     ShowWindow(window_, SW_SHOWDEFAULT);
 }
 

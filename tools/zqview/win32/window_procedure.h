@@ -23,4 +23,16 @@ LRESULT CALLBACK window_procedure(HWND window, UINT message, WPARAM wide, LPARAM
     return DefWindowProcA(window, message, wide, word);
 }
 
+// A second time fails, harmlessly.
+template <class T>
+void register_window_class(const char* name, UINT style, const void* cursor) {
+    WNDCLASSA description{};
+    description.style = style;
+    description.lpfnWndProc = &window_procedure<T>;
+    description.hInstance = GetModuleHandleA(nullptr);
+    description.hCursor = LoadCursorA(nullptr, static_cast<LPCSTR>(cursor));
+    description.lpszClassName = name;
+    RegisterClassA(&description);
+}
+
 #endif
