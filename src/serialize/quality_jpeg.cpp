@@ -1,16 +1,19 @@
-// Rows go straight from the image to libjpeg and back, so that nothing is copied.
+// Rows go straight from the image to libjpeg, and those of U8 straight back, so that nothing is
+// copied.
 #include "serialize/quality_jpeg.h"
 
 #include <algorithm>
 #include <array>
 #include <cstring>
 #include <memory>
+#include <utility>
 
 #include "codecs/jpeg_memory.h"
 #include "codecs/jpeg_session.h"
 #include "convert/copy_rows.h"
 #include "kernels/alpha_rows.h"
 #include "kernels/stream_copy.h"
+#include "kernels/ycc_rows.h"
 #include "serialize/quality_lossless.h"
 #include "serialize/quality_steps.h"
 
@@ -132,75 +135,88 @@ void start(jpeg_decompress_struct& jpeg, const PixelTile& tile, bool colour) {
     jpeg_read_header(&jpeg, TRUE);
     if (!is_plain(jpeg, tile, colour ? 3 : 1)) JpegSession::fail(common, kInitializationError);
     jpeg.jpeg_color_space = colour ? JCS_YCbCr : JCS_GRAYSCALE;
-    jpeg.out_color_space = colour ? JCS_EXT_BGRX : JCS_GRAYSCALE;
+    jpeg.out_color_space = jpeg.jpeg_color_space;
+    jpeg.raw_data_out = colour ? TRUE : FALSE;
     jpeg.dct_method = JDCT_ISLOW;
     jpeg.do_block_smoothing = FALSE;
     jpeg_start_decompress(&jpeg);
 }
 
-// One row of RGB on its way from libjpeg to the image, where it gets its alpha. Rows that lie at a
-// multiple of 32 bytes are written past the cache by libjpeg and would have to be fetched again;
-// this one does not.
-class AlphaRow {
+// Eight rows of luminance and chrominance on their way from libjpeg to pixels with alpha. Cheaper
+// than to let libjpeg make pixels, as their alpha would take another pass over them.
+class YccBand {
   public:
-    AlphaRow(const LosslessPlane& plane, std::int32_t width, Stores stores)
-        : plane_(plane),
-          stores_(stores),
-          memory_(std::make_unique_for_overwrite<std::uint32_t[]>(static_cast<std::size_t>(width) +
-                                                                  kAlignment)) {
-        const auto address =
-            reinterpret_cast<std::uintptr_t>(memory_.get()) / sizeof(std::uint32_t);
-        row_ = memory_.get() + (address % kAlignment == 0 ? 1 : 0);
-    }
-
-    JSAMPROW row() const { return reinterpret_cast<JSAMPROW>(row_); }
-    // The tile's row y, as it lies in row().
-    void deliver(const PixelTile& tile, JDIMENSION y) const {
-        const auto width = static_cast<std::size_t>(tile.width);
-        std::uint8_t* to = tile.first + y * tile.stride;
-        if (plane_.planes == nullptr) {
-            copy_with_alpha(row_, reinterpret_cast<std::uint32_t*>(to), width,
-                            static_cast<std::uint8_t>(plane_.value), stores_);
-            return;
+    // For tiles of up to `width` pixels; `alpha` must outlive the band.
+    YccBand(const LosslessPlane& alpha, std::int32_t width, Stores stores)
+        : alpha_(alpha), stores_(stores), pitch_(pitch_for(static_cast<std::size_t>(width))) {
+        memory_ = std::make_unique_for_overwrite<std::uint8_t[]>((3 * kRowsAtOnce + 1) * pitch_);
+        std::uint8_t* row = memory_.get();
+        for (std::size_t plane = 0; plane < rows_.size(); ++plane) {
+            for (JSAMPROW& each : rows_[plane]) each = std::exchange(row, row + pitch_);
+            planes_[plane] = rows_[plane].data();
         }
-        const std::uint8_t* alpha =
-            plane_.planes->row(0, static_cast<std::size_t>(tile.y) + y) + tile.x;
-        for (std::size_t x = 0; x < width; ++x) row()[4 * x + 3] = alpha[x];
-        std::memcpy(to, row_, 4 * width);
+        constant_alpha_ = row;
+        std::memset(row, alpha.value, pitch_);
+    }
+    YccBand(const YccBand&) = delete;
+    YccBand& operator=(const YccBand&) = delete;
+
+    // The tile's rows from the next on.
+    void read(jpeg_decompress_struct& jpeg, const PixelTile& tile) {
+        const JDIMENSION y = jpeg.output_scanline;
+        jpeg_read_raw_data(&jpeg, planes_.data(), kRowsAtOnce);
+        const JDIMENSION count = std::min(kRowsAtOnce, jpeg.output_height - y);
+        for (JDIMENSION i = 0; i < count; ++i) {
+            ycc_to_bgra({rows_[0][i], rows_[1][i], rows_[2][i], alpha_row(tile, y + i)},
+                        reinterpret_cast<std::uint32_t*>(tile.first + (y + i) * tile.stride),
+                        static_cast<std::size_t>(tile.width), stores_);
+        }
     }
 
   private:
-    static constexpr std::size_t kAlignment = 8;  // pixels
+    // Whole blocks; an odd number of cache lines, so that rows do not drive each other out of it.
+    static std::size_t pitch_for(std::size_t width) {
+        constexpr std::size_t kLine = 64;
+        return (((width + kLine - 1) / kLine) | 1) * kLine;
+    }
 
-    const LosslessPlane& plane_;
+    const std::uint8_t* alpha_row(const PixelTile& tile, JDIMENSION y) const {
+        if (alpha_.planes == nullptr) return constant_alpha_;
+        return alpha_.planes->row(0, static_cast<std::size_t>(tile.y) + y) + tile.x;
+    }
+
+    const LosslessPlane& alpha_;
     Stores stores_;
-    std::unique_ptr<std::uint32_t[]> memory_;
-    std::uint32_t* row_;
+    std::size_t pitch_;
+    std::unique_ptr<std::uint8_t[]> memory_;
+    const std::uint8_t* constant_alpha_;
+    std::array<std::array<JSAMPROW, kRowsAtOnce>, 3> rows_;
+    std::array<JSAMPARRAY, 3> planes_;
 };
 
-// `between` is null for types without alpha, whose rows go straight to the tile.
-void read_tile(std::span<const std::uint8_t> bytes, const PixelTile& tile,
-               const AlphaRow* between) {
+// `band` is null for U8, whose rows go straight to the tile.
+void read_tile(std::span<const std::uint8_t> bytes, const PixelTile& tile, YccBand* band) {
     JpegSource source(bytes);
     JpegDecompressor session;
     jpeg_decompress_struct& jpeg = session.jpeg();
     source.attach(jpeg);
     session.run(kInitializationError, [&] {
-        start(jpeg, tile, between != nullptr);
+        start(jpeg, tile, band != nullptr);
         while (jpeg.output_scanline < jpeg.output_height) {
-            const JDIMENSION y = jpeg.output_scanline;
-            JSAMPROW row = between != nullptr ? between->row() : tile.first + y * tile.stride;
-            jpeg_read_scanlines(&jpeg, &row, 1);
-            if (between != nullptr) between->deliver(tile, y);
+            if (band != nullptr) {
+                band->read(jpeg, tile);
+            } else {
+                JSAMPROW row = tile.first + jpeg.output_scanline * tile.stride;
+                jpeg_read_scanlines(&jpeg, &row, 1);
+            }
         }
     });
 }
 
 void read_tiles(std::span<const std::span<const std::uint8_t>> streams, const Image& target,
-                const AlphaRow* between) {
+                YccBand* band) {
     std::size_t next = 0;
-    for_each_tile(target,
-                  [&](const PixelTile& tile) { read_tile(streams[next++], tile, between); });
+    for_each_tile(target, [&](const PixelTile& tile) { read_tile(streams[next++], tile, band); });
 }
 
 void copy_pixels(const Image& source, const Image& target) {
@@ -234,25 +250,25 @@ void read_jpeg(StreamReader& reader, Image& image, PixelMemory memory) {
     std::vector<std::span<const std::uint8_t>> streams;
     for_each_tile(image, [&](const PixelTile&) { streams.push_back(reader.section()); });
     LosslessPlane plane;
-    std::unique_ptr<AlphaRow> between;
+    std::unique_ptr<YccBand> band;
     if (image.type() == PixelType::kRgb) {
         const auto width = static_cast<std::size_t>(record.width);
         const auto height = static_cast<std::size_t>(record.height);
         plane = read_lossless(reader, width, height, 1);
         const Stores stores =
             memory == PixelMemory::kFresh ? Stores::kCached : stores_for(4 * width * height);
-        between = std::make_unique<AlphaRow>(plane, record.width, stores);
+        band = std::make_unique<YccBand>(plane, std::min(record.width, kJpegSide), stores);
     }
     reader.expect_end();
     if (is_one_tile(image)) {
-        read_tiles(streams, image, between.get());
+        read_tiles(streams, image, band.get());
         finish_streaming();
         return;
     }
     Image scratch(Variant::kPrivate, {});
     scratch.reinitialise(
         {.type = record.type, .width = record.width, .height = record.height, .border = 0});
-    read_tiles(streams, scratch, between.get());
+    read_tiles(streams, scratch, band.get());
     finish_streaming();
     copy_pixels(scratch, image);
 }

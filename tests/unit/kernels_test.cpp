@@ -8,6 +8,9 @@
 #include "kernels/colour_rows.h"
 #include "kernels/colour_rows_scalar.h"
 #include "kernels/pack_bits.h"
+#include "kernels/stream_copy.h"
+#include "kernels/ycc_rows.h"
+#include "kernels/ycc_rows_scalar.h"
 #include "support/simd_targets.h"
 
 namespace zq {
@@ -40,6 +43,51 @@ TEST(Kernels, ColourRowsEqualThePlainLoopAndStayInside) {
                 c.fast(source.data(), actual.data() + 1, pixels);
                 ASSERT_EQ(actual, expected) << c.name << ' ' << pixels << " pixels";
             }
+        }
+    });
+}
+
+// Every luminance with every chrominance: a row has all y for all cr.
+TEST(Kernels, EveryYccColourEqualsThePlainLoop) {
+    constexpr std::size_t kPixels = 256 * 256;
+    std::vector<std::uint8_t> y(kPixels), cb(kPixels), cr(kPixels), alpha(kPixels);
+    for (std::size_t i = 0; i < kPixels; ++i) {
+        y[i] = static_cast<std::uint8_t>(i);
+        cr[i] = static_cast<std::uint8_t>(i / 256);
+        alpha[i] = static_cast<std::uint8_t>(i * 7);
+    }
+    const YccRow row = {y.data(), cb.data(), cr.data(), alpha.data()};
+    std::vector<std::uint32_t> expected(kPixels), actual(kPixels);
+    for (int blue = 0; blue < 256; ++blue) {
+        std::fill(cb.begin(), cb.end(), static_cast<std::uint8_t>(blue));
+        scalar::ycc_to_bgra(row, expected.data(), kPixels);
+        zqtest::on_every_simd_target([&] {
+            ycc_to_bgra(row, actual.data(), kPixels, Stores::kCached);
+            ASSERT_EQ(actual, expected) << "cb " << blue;
+        });
+    }
+}
+
+TEST(Kernels, YccRowsOfEveryLengthStayInside) {
+    std::mt19937 random(5);
+    zqtest::on_every_simd_target([&] {
+        for (std::size_t n = 0; n <= 400; ++n) {
+            const std::size_t pixels = n / 2;
+            std::vector<std::uint8_t> planes[4];
+            for (auto& plane : planes) {
+                plane.resize(pixels);
+                for (auto& byte : plane) byte = static_cast<std::uint8_t>(random());
+            }
+            const YccRow row = {planes[0].data(), planes[1].data(), planes[2].data(),
+                                planes[3].data()};
+            const std::size_t start = random() % 16 + 1;
+            std::vector<std::uint32_t> expected(pixels + 32, kGuard);
+            std::vector<std::uint32_t> actual = expected;
+            scalar::ycc_to_bgra(row, expected.data() + start, pixels);
+            ycc_to_bgra(row, actual.data() + start, pixels,
+                        n % 2 == 0 ? Stores::kStreamed : Stores::kCached);
+            finish_streaming();
+            ASSERT_EQ(actual, expected) << pixels << " pixels from " << start;
         }
     });
 }

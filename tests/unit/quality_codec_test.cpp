@@ -12,8 +12,10 @@
 #include <vector>
 
 #include "base/byte_order.h"
+#include "codecs/jpeg_memory.h"
 #include "image/image.h"
 #include "serialize/quality_codec.h"
+#include "serialize/quality_jpeg.h"
 #include "tests/support/thoroughness.h"
 
 namespace zq {
@@ -312,6 +314,43 @@ TEST(QualityCodecTest, HuesStayOnTheirSideOfTheSeam) {
             for (int x = 0; x < size.width; ++x) {
                 ASSERT_LT(std::abs(image->row(y)[4 * x + 2] - back->row(y)[4 * x + 2]), 40)
                     << x << ' ' << y;
+            }
+        }
+    }
+}
+
+// Colours are made by the codec itself, out of libjpeg's planes.
+TEST(QualityCodecTest, ColoursAreThoseOfLibjpeg) {
+    constexpr std::int32_t kWidth = 83, kHeight = 21;
+    const auto image = make({ZQ_TYPE_RGB, kWidth, kHeight, 0});
+    paint(*image, noise);
+    Bytes payload;
+    put_jpeg(payload, *image, 600);
+    constexpr std::uint8_t kStart[] = {0xFF, 0xD8, 0xFF};
+    const auto start = std::search(payload.begin(), payload.end(), kStart, kStart + 3);
+    JpegSource source({start, payload.end()});
+    JpegDecompressor session;
+    jpeg_decompress_struct& jpeg = session.jpeg();
+    source.attach(jpeg);
+    const auto expected = blank_like(*image);
+    session.run(kSystemError, [&] {
+        jpeg_read_header(&jpeg, TRUE);
+        jpeg.jpeg_color_space = JCS_YCbCr;
+        jpeg.out_color_space = JCS_EXT_BGRX;
+        jpeg_start_decompress(&jpeg);
+        while (jpeg.output_scanline < jpeg.output_height) {
+            JSAMPROW row = expected->row(static_cast<std::int32_t>(jpeg.output_scanline));
+            jpeg_read_scanlines(&jpeg, &row, 1);
+        }
+    });
+    const auto back = blank_like(*image);
+    StreamReader reader(payload);
+    read_jpeg(reader, *back, PixelMemory::kUsed);
+    for (std::int32_t y = 0; y < kHeight; ++y) {
+        for (std::int32_t x = 0; x < kWidth; ++x) {
+            for (int i = 0; i < 3; ++i) {
+                ASSERT_EQ(get(*back, x, y, i), get(*expected, x, y, i))
+                    << x << ' ' << y << ' ' << i;
             }
         }
     }
