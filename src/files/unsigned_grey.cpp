@@ -1,22 +1,18 @@
-// Samples of 16-bit grey, four at a time.
+// Samples of 16-bit grey.
 #include "files/unsigned_grey.h"
 
 #include <algorithm>
-#include <cstring>
 #include <limits>
+
+#include "kernels/grey_range.h"
 
 namespace zq {
 
+// As a pixel, which is signed, such a sample is negative.
 bool any_above_signed(const std::uint8_t* row, std::size_t bytes) {
-    std::uint64_t all = 0;
-    std::size_t i = 0;
-    for (; i + sizeof(all) <= bytes; i += sizeof(all)) {
-        std::uint64_t four;
-        std::memcpy(&four, row + i, sizeof(four));
-        all |= four;
-    }
-    for (; i < bytes; i += 2) all |= std::uint64_t{row[i + 1]} << 8;
-    return (all & 0x8000800080008000U) != 0;
+    SampleRange range;
+    widen_range(reinterpret_cast<const std::int16_t*>(row), bytes / 2, 1, 0, range);
+    return range.least < 0;
 }
 
 void shift_unsigned_samples(Image& image, std::int32_t offset) {
