@@ -15,7 +15,8 @@ namespace zq {
 namespace {
 
 constexpr std::int64_t kMostWhole = std::int64_t{1} << 17;
-// Of images up to here single pixels decide which quality is the truest.
+// Of images up to here the touches are chosen, not only their share, as single pixels decide which
+// quality is the truest.
 constexpr std::int64_t kMostTouched = std::int64_t{1} << 12;
 
 std::int64_t pixels_of(const Image& image) {
@@ -29,11 +30,12 @@ constexpr SampleShape kJpegSample = {1024, 32, 4};
 constexpr SampleShape kWaveletSample = {256, 256, 1};
 constexpr std::int32_t kBlock = 8;  // JPEG blocks come out the same wherever they stand
 
-// How far back lower qualities are tried: `least_back`, and farther while the error does not fall
-// as evenly as it does in photographs: to the lowest in small images, where colours that clip may
-// make some low quality exact; else up to kMostBack, until the error is `far` times the best.
+// How far back lower qualities are tried: where the error grows as evenly as it does in
+// photographs, `least_back` and until it is kClearlyWorse times the best; where it does not, until
+// it is `far` times the best, and to the lowest in small images, where colours that clip may make
+// some low quality exact.
 constexpr std::int64_t kMostSearched = std::int64_t{1} << 15;
-constexpr int kMostBack = 32;
+constexpr double kClearlyWorse = 1.1;
 struct Evenness {
     double least_ratio, most_ratio;  // from one quality to the next
     double far;
@@ -165,10 +167,7 @@ class Trials {
         StreamReader reader(payload);
         read_payload(reader, result_, PixelMemory::kUsed);
         measure();
-        double total = total_of(errors_);
-        if (is_touched_) {
-            total -= total_of(choose_touches(errors_, result_.type(), touches_));
-        }
+        const double total = left_after_touches();
         if (best_.quality == 0 || total < margin_ * best_total_) {
             best_total_ = total;
             best_.quality = quality;
@@ -187,6 +186,12 @@ class Trials {
     QualityChoice take() { return std::move(best_); }
 
   private:
+    double left_after_touches() {
+        const double total = total_of(errors_);
+        if (is_touched_) return total - total_of(choose_touches(errors_, result_.type(), touches_));
+        return total * (1 - touched_part(errors_, result_.type(), touches_));
+    }
+
     void measure() {
         const Image& picture = sample_.picture();
         const Distance distance = distance_of(picture.type());
@@ -224,18 +229,20 @@ QualityChoice choose_quality(const Image& image, int quality) {
     if (is_jpeg && !sample.is_whole()) return trials.take();
     const Evenness& limits = is_jpeg ? kJpeg : kWavelets;
     const bool to_the_lowest = pixels_of(image) <= kMostSearched;
-    // The lowest is tried first there.
-    const int most_back = to_the_lowest ? quality - 2 : std::min(quality - 1, kMostBack);
     const double far = to_the_lowest ? std::numeric_limits<double>::infinity() : limits.far;
     bool is_even = true;
     if (to_the_lowest && quality > 1) {
         is_even = trials.attempt(1) > kSurelyWorse * trials.best_total();
     }
-    for (int back = 1; back <= most_back && trials.best_total() > 0; ++back) {
-        const double total = trials.attempt(quality - back);
+    // The lowest has been tried then.
+    const int lowest = to_the_lowest ? 2 : 1;
+    for (int lower = quality - 1; lower >= lowest && trials.best_total() > 0; --lower) {
+        const double total = trials.attempt(lower);
         is_even =
             is_even && total > limits.least_ratio * above && total < limits.most_ratio * above;
-        if (is_even ? back >= limits.least_back : total > far * trials.best_total()) break;
+        const bool is_near = quality - lower < limits.least_back;
+        const double enough = is_even ? kClearlyWorse : far;
+        if (!(is_even && is_near) && total > enough * trials.best_total()) break;
         above = total;
     }
     return trials.take();

@@ -18,7 +18,8 @@ constexpr double kPartOfPixel = 1.001;  // so that equal errors leave no two qua
 constexpr double kUnits = 4;
 constexpr double kMostPart = 0.005;
 
-double part_of(double total, std::size_t pixels, bool is_float) {
+double part_of(double total, std::size_t pixels, PixelType type) {
+    const bool is_float = type == PixelType::kSgl || type == PixelType::kComplex;
     const double part = std::max(kPart, kPartOfPixel / static_cast<double>(pixels));
     return is_float ? part : std::max(part, std::min(kUnits / total, kMostPart));
 }
@@ -60,12 +61,14 @@ double total_of(std::span<const PixelError> errors) {
                            [](double sum, const PixelError& e) { return sum + e.squared; });
 }
 
-std::span<PixelError> choose_touches(std::span<PixelError> errors, PixelType type, int quality) {
+double touched_part(std::span<const PixelError> errors, PixelType type, int quality) {
     const double total = total_of(errors);
-    if (total <= 0) return {};
-    const bool is_float = type == PixelType::kSgl || type == PixelType::kComplex;
-    const double part = quality * part_of(total, errors.size(), is_float);
-    return part < 1 ? errors.first(take_up_to(errors, part * total)) : errors;
+    return total > 0 ? std::min(quality * part_of(total, errors.size(), type), 1.0) : 1.0;
+}
+
+std::span<PixelError> choose_touches(std::span<PixelError> errors, PixelType type, int quality) {
+    const double part = touched_part(errors, type, quality);
+    return part < 1 ? errors.first(take_up_to(errors, part * total_of(errors))) : errors;
 }
 
 void put_touches(Bytes& out, const Image& image, std::span<PixelError> errors, int quality) {
