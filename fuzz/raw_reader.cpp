@@ -10,7 +10,7 @@ constexpr std::size_t kParameters = 16;
 ZqRawParameters parameters;
 
 void read_raw(const char* path, zq::Image& target, const zq::Accept& accept) {
-    zq::read_file(path, target, &parameters, accept);
+    if (!zq::read_file(path, target, &parameters, accept)) throw kUnsupportedFileType;
 }
 
 }  // namespace

@@ -60,7 +60,7 @@ inline std::string state_of(const zq::Image& image) {
 using Reader = void (*)(const char* path, zq::Image& target, const zq::Accept& accept);
 
 inline void read_any(const char* path, zq::Image& target, const zq::Accept& accept) {
-    zq::read_file(path, target, nullptr, accept);
+    if (!zq::read_file(path, target, nullptr, accept)) throw kUnsupportedFileType;
 }
 
 inline GRLIBError_enum read(Reader reader, const char* path, zq::Image& target,

@@ -160,7 +160,8 @@ ZQ_API ZqError ZQ_CALL ZqWriteFileByCode(const char* path, ZqImageHandle image,
  * sets the calibration, too: its numbers, as they are, become the steps, its unit 8 (inch), 4 (cm)
  * or 0; a write does the reverse with the steps rounded and kept within 1 to 65535. PNG and TIFF of
  * 16-bit grey become I16; unsigned samples above 32767 come through with all samples moved down by
- * 32768 (see ZqGetSampleOffset), and a write gives the file's samples back. Of a TIFF the first
+ * 32768 (see ZqGetSampleOffset); a write to TIFF or lossless JPEG 2000 gives the file's samples
+ * back, one to PNG lets them begin at 0 and says by how much. Of a TIFF the first
  * page is read and turned as its orientation says; grey of 9 to 15 bits becomes I16 with that bit
  * depth, grey of 32 and 64 bits float; CMYK, YCbCr and CIE L*a*b* become RGB; a resolution becomes
  * the calibration (unit 8 inch, 4 centimetre). path         borrowed; empty or null: -1074395989.

@@ -179,7 +179,7 @@ ZQ_API ZqError ZQ_CALL ZqGetPixelAddress(ZqImageHandle image, int32_t x, int32_t
 ZQ_API ZqError ZQ_CALL ZqSetBitDepth(ZqImageHandle image, int32_t bitDepth);
 ZQ_API ZqError ZQ_CALL ZqGetBitDepth(ZqImageHandle image, int32_t* bitDepth);
 
-/* What reading a file added to its 16-bit samples (0 or negative): value = sample + offset. */
+/* What reading a file added to its 16-bit samples: value = sample + offset. */
 ZQ_API ZqError ZQ_CALL ZqGetSampleOffset(ZqImageHandle image, int32_t* offset);
 
 /* Hangs a client's object on an image under a class; one of that class that was there is destroyed.

@@ -36,18 +36,14 @@ void write_image(const char* path, ZqImageHandle handle, const ZqWriteOptions* o
 void read_image(ZqImageHandle handle, const char* path, const ZqRawParameters* raw,
                 ZqStringHandle* type_name, std::int32_t* pixel_format, ZqArrayU32Handle* table) {
     const LockedImage image(handle);
-    try {
-        read_file(path, *image, raw, [&](const FileContents& contents) {
-            if (type_name != nullptr) host::set_string(type_name, contents.type_name);
-            if (table != nullptr) host::set_array(table, contents.colour_table);
-            put(pixel_format, static_cast<std::int32_t>(contents.pixel_format));
-        });
-    } catch (GRLIBError_enum code) {
-        if (code == kUnsupportedFileType && raw == nullptr && type_name != nullptr) {
-            host::set_string(type_name, "xxx");
-        }
-        throw;
-    }
+    const auto accept = [&](const FileContents& contents) {
+        if (type_name != nullptr) host::set_string(type_name, contents.type_name);
+        if (table != nullptr) host::set_array(table, contents.colour_table);
+        put(pixel_format, static_cast<std::int32_t>(contents.pixel_format));
+    };
+    if (read_file(path, *image, raw, accept)) return;
+    if (type_name != nullptr) host::set_string(type_name, "xxx");
+    throw kUnsupportedFileType;
 }
 
 }  // namespace

@@ -31,26 +31,24 @@ void write_file(const char* path, std::int32_t type_code, const WriteJob& job) {
     write_as(path, type_code, job);
 }
 
-void read_file(const char* path, Image& target, const ZqRawParameters* raw, const Accept& accept) {
+bool read_file(const char* path, Image& target, const ZqRawParameters* raw, const Accept& accept) {
     if (is_empty(path)) throw kUnableToReadData;
     InputFile file(path);
-    if (raw == nullptr) {
-        read_file(file, target, accept);
-        return;
-    }
+    if (raw == nullptr) return read_file(file, target, accept);
     bool recognised = false;
     throw_if_failed(RawFileHandler(*raw, target.extent()).read(file, target, accept, recognised));
+    return true;
 }
 
-void read_file(InputFile& file, Image& target, const Accept& accept) {
+bool read_file(InputFile& file, Image& target, const Accept& accept) {
     for (const HandlerEntry& entry : handlers()) {
         if (!entry.probed) continue;
         file.rewind();
         bool recognised = false;
         throw_if_failed(entry.make(entry)->read(file, target, accept, recognised));
-        if (recognised) return;
+        if (recognised) return true;
     }
-    throw kUnsupportedFileType;
+    return false;
 }
 
 }  // namespace zq

@@ -13,12 +13,13 @@ namespace zq {
 void write_file(const char* path, const char* type_name, const WriteJob& job);
 void write_file(const char* path, std::int32_t type_code, const WriteJob& job);
 
-// The target gets the type and size that the file holds, and keeps its border. Throws
-// kUnableToReadData for an empty path, kUnsupportedFileType for a file that nobody recognises, and
-// what the handler returns. With parameters, which are present, the file has no header and is read
+// The target gets the type and size that the file holds, and keeps its border. False: nobody
+// recognises the file, and nothing has changed. Throws kUnableToReadData for an empty path and what
+// the handler returns. With parameters, which are present, the file has no header and is read
 // by them, in the target's own size, instead of being probed.
-void read_file(const char* path, Image& target, const ZqRawParameters* raw, const Accept& accept);
+[[nodiscard]] bool read_file(const char* path, Image& target, const ZqRawParameters* raw,
+                             const Accept& accept);
 // The same from an open file.
-void read_file(InputFile& file, Image& target, const Accept& accept);
+[[nodiscard]] bool read_file(InputFile& file, Image& target, const Accept& accept);
 
 }  // namespace zq

@@ -87,7 +87,10 @@ LoadedBuffer load_buffer(const char* path, std::int32_t mode) {
     std::vector<std::uint32_t> table;
     const auto accept = [&table](const FileContents& contents) { table = contents.colour_table; };
     throw_if(code_of([&] { image = make_image(type); }), kBufferNotEnoughMemory);
-    throw_if(code_of([&] { read_file(path, *image, nullptr, accept); }), kBufferReadFailed);
+    const auto read = [&] {
+        if (!read_file(path, *image, nullptr, accept)) throw kUnsupportedFileType;
+    };
+    throw_if(code_of(read), kBufferReadFailed);
     throw_if(code_of([&] { image = converted(std::move(image), type, table); }),
              kBufferNotEnoughMemory);
 

@@ -51,7 +51,10 @@ png_byte nearest_entry(std::span<const std::uint32_t> table, const ZqPngSettings
     std::size_t nearest = 0;
     std::int64_t least = INT64_MAX;
     for (std::size_t i = 0; i < table.size(); ++i) {
-        const auto squared = [](std::uint32_t a, std::int64_t b) { return (a - b) * (a - b); };
+        const auto squared = [](std::int64_t entry, std::int64_t wanted) {
+            const std::int64_t apart = entry - std::min<std::int64_t>(wanted, 255);
+            return apart * apart;
+        };
         const std::int64_t distance = squared(table[i] >> 16 & 255, settings.backgroundRed) +
                                       squared(table[i] >> 8 & 255, settings.backgroundGreen) +
                                       squared(table[i] & 255, settings.backgroundBlue);

@@ -8,6 +8,7 @@
 #include "files/alpha_in_use.h"
 
 #include "kernels/colour_rows.h"
+#include "kernels/grey_range.h"
 #include "kernels/png_samples.h"
 
 namespace zq {
@@ -15,7 +16,6 @@ namespace zq {
 namespace {
 
 constexpr std::int32_t kLargestSetting = 100;
-constexpr std::int32_t kLargestSample = 65535;
 
 void write_bytes(png_structp png, png_bytep bytes, std::size_t count) {
     auto* file = static_cast<OutputFile*>(png_get_io_ptr(png));
@@ -25,33 +25,19 @@ void write_bytes(png_structp png, png_bytep bytes, std::size_t count) {
 // The stream is flushed at the end, where a failure is seen.
 void flush_nothing(png_structp) {}
 
-struct Range {
-    std::int32_t lowest;
-    std::int32_t highest;
-};
-
-Range range_of(const PixelView& pixels) {
-    std::int16_t lowest = INT16_MAX;
-    std::int16_t highest = INT16_MIN;
+std::int32_t lowest_of(const PixelView& pixels) {
+    SampleRange range;
     for (std::int32_t y = 0; y < pixels.height; ++y) {
-        const auto* row = reinterpret_cast<const std::int16_t*>(pixels.row(y));
-        for (std::int32_t x = 0; x < pixels.width; ++x) {
-            lowest = std::min(lowest, row[x]);
-            highest = std::max(highest, row[x]);
-        }
+        widen_range(reinterpret_cast<const std::int16_t*>(pixels.row(y)),
+                    static_cast<std::size_t>(pixels.width), 1, 0, range);
     }
-    return {lowest, highest};
+    return range.least;
 }
 
-// The offset with which the image was read, so that its samples become what they were; or the one
-// that its negative values need.
+// What the lowest value needs, whatever the image was read with.
 std::int32_t choose_sample_offset(const PixelView& pixels) {
     if (pixels.packing == Packing::kUnsigned16) return 0;
-    const Range range = range_of(pixels);
-    const std::int32_t remembered = pixels.sample_offset;
-    if (range.lowest >= remembered && range.highest - remembered <= kLargestSample)
-        return remembered;
-    return std::min(range.lowest, 0);
+    return std::min(lowest_of(pixels), 0);
 }
 
 }  // namespace

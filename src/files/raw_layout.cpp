@@ -57,9 +57,8 @@ RawLayout raw_layout(const ZqRawParameters& parameters) {
     const Format format = exists ? kFormats[static_cast<std::size_t>(code)] : Format{};
     if (format.bits_per_pixel == 0) throw kInvalidFileHeader;
     const bool strided = parameters.layoutMode == kStridedMode;
-    if (parameters.dataOffset < 0 || (strided && parameters.layout[0] < 0)) {
-        throw kInvalidParameter;
-    }
+    if (strided && parameters.layout[0] < 0) throw kInvalidParameter;
+    if (parameters.dataOffset < 0) throw kUnableToReadData;
     layout.format = static_cast<PixelFormat>(code);
     layout.type = format.type;
     layout.bits_per_pixel = format.bits_per_pixel;

@@ -76,12 +76,14 @@ struct Resolution {
 // None for a calibration that is no length on paper.
 std::optional<Resolution> resolution_of(const Calibration& calibration) {
     const bool inch = calibration.unit == kUnitInch;
-    const float steps = calibration.unit == kUnitMetre ? 0.01F : 1.0F;
+    // In double, so that a hundredth does not cost the last digit.
+    const double steps = calibration.unit == kUnitMetre ? 0.01 : 1.0;
     if (!inch && calibration.unit != kUnitCentimetre && calibration.unit != kUnitMetre)
         return std::nullopt;
     const Resolution resolution = {
         static_cast<std::uint16_t>(inch ? RESUNIT_INCH : RESUNIT_CENTIMETER),
-        steps / calibration.x_step, steps / calibration.y_step};
+        static_cast<float>(steps / calibration.x_step),
+        static_cast<float>(steps / calibration.y_step)};
     const auto usable = [](float value) { return std::isnormal(value) && value > 0; };
     if (!usable(resolution.x) || !usable(resolution.y)) return std::nullopt;
     return resolution;

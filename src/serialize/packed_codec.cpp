@@ -46,6 +46,10 @@ class PackedCodec final : public PixelCodec {
         }
     }
 
+    bool writes_all(const Image& image, const ZqFlattenContext& /*context*/) const override {
+        return image.record().border == 0;
+    }
+
     void quality(std::int32_t& value, bool set) override { fixed_quality(value, set); }
 
     void check(const ZqFlattenContext& context) const override {

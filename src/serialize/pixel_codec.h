@@ -30,6 +30,9 @@ class PixelCodec {
     virtual void decode(Image& image, const ZqFlattenContext& context,
                         PixelMemory memory) const = 0;
 
+    // Whether decode leaves no pixel of such an image, border included, as it was in the memory.
+    virtual bool writes_all(const Image& image, const ZqFlattenContext& context) const = 0;
+
     // Reads, or with `set` stores, the quality.
     virtual void quality(std::int32_t& value, bool set) = 0;
 

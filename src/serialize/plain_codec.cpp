@@ -41,7 +41,7 @@ class PlainCodec final : public PixelCodec {
         const std::span<std::uint8_t> to = image.whole_rows();
         const auto to_line = static_cast<std::size_t>(image.record().rowPixels);
         const std::size_t from_line = context.lineWidth;
-        if (to_line == from_line) {
+        if (writes_all(image, context)) {
             copy_block(to.data(), from.data(), std::min(to.size(), from.size()));
             return;
         }
@@ -51,6 +51,10 @@ class PlainCodec final : public PixelCodec {
             const auto here = part(from, row * from_line, bytes);
             copy_block(there.data(), here.data(), std::min(there.size(), here.size()));
         }
+    }
+
+    bool writes_all(const Image& image, const ZqFlattenContext& context) const override {
+        return static_cast<std::uint32_t>(image.record().rowPixels) == context.lineWidth;
     }
 
     void quality(std::int32_t& value, bool set) override { fixed_quality(value, set); }

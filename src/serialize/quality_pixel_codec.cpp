@@ -22,6 +22,10 @@ class QualityCodec final : public PixelCodec {
         decompress_pixels(image, block_bytes(context.pixelBlock, context.pixelBlockSize), memory);
     }
 
+    bool writes_all(const Image& /*image*/, const ZqFlattenContext& /*context*/) const override {
+        return true;
+    }
+
     void quality(std::int32_t& value, bool set) override {
         if (set) {
             quality_ = std::clamp(value, kLeastStored, kBestQuality);

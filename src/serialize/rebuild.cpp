@@ -18,7 +18,7 @@ namespace zq {
 
 namespace {
 
-// What an image may take in memory without pixels to show for it, and for each byte of pixels. No
+// What new memory an image may take without pixels to show for it, and for each byte of pixels. No
 // codec needs more, unless a small image has a border of thousands of pixels: the plain one stores
 // whole rows, the packed one a bit a pixel, and the quality codec keeps its blocks long enough.
 constexpr std::uint64_t kFreeBytes = std::uint64_t{64} << 20;
@@ -64,11 +64,13 @@ class Rebuilding {
     }
 
     void into(Image& image) {
+        if (!has_shape(image)) refuse_what_pixels_do_not_explain(shape_, context_.pixelBlockSize);
         write_pixels(image);
         describe(image);
     }
 
     Created into_new_image() {
+        refuse_what_pixels_do_not_explain(shape_, context_.pixelBlockSize);
         const bool private_one = is_full() && context_.keepName != 0 && !source_.name.empty();
         const std::string name =
             private_one ? std::string(source_.name) : name_of_remote(context_.sourceImage);
@@ -89,7 +91,6 @@ class Rebuilding {
             codec_ = FlattenSettings::instance().decoder(id);
         }
         if (codec_ != nullptr) codec_->check(context_);
-        refuse_what_pixels_do_not_explain(shape_, context_.pixelBlockSize);
     }
 
     bool may_fail_late() const { return codec_ != nullptr && codec_->may_fail_late(); }
@@ -116,7 +117,7 @@ class Rebuilding {
             shape.width = shape.height = 0;
         }
         image.reinitialise(shape);
-        if (codec_ == nullptr) clear(image);
+        if (codec_ == nullptr || !codec_->writes_all(image, context_)) clear(image);
         write_pixels(image);
     }
 

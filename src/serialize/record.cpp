@@ -81,10 +81,10 @@ RecordHeader RecordHeader::read(std::span<const std::uint8_t> record, std::endia
     if (header[RecordWord::kVersion] >= kNewestVersion) {
         need(kReferenceWords * kWordBytes);
         header[RecordWord::kKind] = load_word(record.data() + kWordBytes, machine);
-        const bool known = header[RecordWord::kVersion] == kNewestVersion;
-        if (known && header.kind() > FlattenKind::kByReference) throw kFlattenKind;
     }
     need(header.size());
+    const bool has_kind = header[RecordWord::kVersion] == kNewestVersion;
+    if (has_kind && header.kind() > FlattenKind::kByReference) throw kFlattenKind;
     const Places places = places_of(header);
     const std::uint8_t* from = record.data() + kWordBytes;
     for (std::size_t i = places.first; i < places.end; ++i, from += kWordBytes) {

@@ -45,12 +45,6 @@ ZqFlattenContext context_of(const RecordHeader& header) {
     return context;
 }
 
-// The oldest version has no image setting: its context ends before.
-std::size_t context_length(const RecordHeader& header) {
-    return header[RecordWord::kVersion] == kOldestVersion ? ZQ_FLATTEN_CONTEXT_BASE
-                                                          : ZQ_FLATTEN_CONTEXT_FULL;
-}
-
 }  // namespace
 
 Created unflatten(ImageHandle destination, ZqStringHandle string, Redirection redirection) {
@@ -72,7 +66,10 @@ Created unflatten(ImageHandle destination, ZqStringHandle string, Redirection re
     ZqFlattenContext context = context_of(header);
     context.pixelBlock = blocks.pixels.data();
     context.propertyBlock = blocks.properties.data();
-    return rebuild(destination, {context, context_length(header), name, std::move(attachment)});
+    // An image's name ends at a zero byte.
+    const std::string_view image_name = name.c_str();
+    return rebuild(destination,
+                   {context, ZQ_FLATTEN_CONTEXT_FULL, image_name, std::move(attachment)});
 }
 
 }  // namespace zq

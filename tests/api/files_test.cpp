@@ -124,6 +124,13 @@ TEST_F(FilesTest, TellsWhatTheFileIs) {
     EXPECT_EQ(ZqReadFile(target.handle(), path_.c_str(), nullptr, type.out(), nullptr, nullptr),
               kUnsupported);
     EXPECT_EQ(type.text(), "xxx");
+    // A header of 56 bytes is recognised, and not supported.
+    store_bytes(
+        path_, std::string("BM\x52\0\0\0\0\0\0\0\x42\0\0\0\x38\0\0\0", 18) + std::string(64, '\0'));
+    refhost::String kept("before");
+    EXPECT_EQ(ZqReadFile(target.handle(), path_.c_str(), nullptr, kept.out(), nullptr, nullptr),
+              kUnsupported);
+    EXPECT_EQ(kept.text(), "before");
     EXPECT_EQ(target.state(), picture.state());
 }
 

@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <cstdint>
 #include <cstring>
+#include <span>
 #include <string>
 #include <vector>
 
@@ -38,14 +39,18 @@ constexpr int32_t kPlain = 0, kQuality = 1, kPacked = 2;
 constexpr int32_t kOld = 0x00070000, kText = 0x00070100, kNew = 0x00080000;
 
 // Bytes from pixel (-border, -border) to the end of the last border row's line.
-std::string whole_buffer(const Picture& picture) {
-    const ZqImageRecord& record = picture.record();
+std::span<uint8_t> buffer_of(const ZqImageRecord& record) {
     const auto pixel = static_cast<ptrdiff_t>(Picture::pixel_bytes(record.type));
-    const uint8_t* first =
-        record.firstPixel - (ptrdiff_t{record.rowPixels} + 1) * record.border * pixel;
+    uint8_t* first = record.firstPixel - (ptrdiff_t{record.rowPixels} + 1) * record.border * pixel;
     const auto rows = static_cast<size_t>(record.height) + 2 * static_cast<size_t>(record.border);
-    return {reinterpret_cast<const char*>(first),
-            rows * static_cast<size_t>(record.rowPixels * pixel)};
+    return {first, rows * static_cast<size_t>(record.rowPixels * pixel)};
+}
+std::string whole_buffer(const ZqImageRecord& record) {
+    const std::span<uint8_t> buffer = buffer_of(record);
+    return {buffer.begin(), buffer.end()};
+}
+std::string whole_buffer(const Picture& picture) {
+    return whole_buffer(picture.record());
 }
 
 TEST(FlattenTest, EveryWordStandsInItsPlace) {
@@ -224,6 +229,41 @@ TEST(FlattenTest, ABlockMustFitItsGeometryAndLeavesTheDestination) {
         EXPECT_EQ(image.state(), before) << c.what;
         EXPECT_EQ(Rebuilt(record.bytes()).handle, nullptr) << c.what;
     }
+}
+
+// Memory of 64 KiB, which the allocator hands out again.
+TEST(FlattenTest, NewImagesShowNothingOfTheMemoryBefore) {
+    const Record narrow = [] {
+        Record record = zqtest::grey_record(kNew, 60, 60, 30, 120 * 8);
+        record.words[zqtest::kType] = ZQ_TYPE_RGBU64;
+        record.words[zqtest::kLine] = 127;
+        record.pixels.assign(size_t{127} * 8 * 120, '\0');
+        return record;
+    }();
+    Picture black(ZQ_TYPE_U8, 60, 60, 100);
+    black.set_pixels(std::string(size_t{60} * 60, '\0'));
+    for (const std::string& bytes : {flattened(black.handle(), kPacked), narrow.bytes()}) {
+        size_t size = 0;
+        {
+            const Rebuilt first(bytes);
+            ASSERT_EQ(first.code, 0);
+            const std::span<uint8_t> buffer = buffer_of(*first.handle);
+            std::ranges::fill(buffer, uint8_t{0x55});
+            size = buffer.size();
+        }
+        const Rebuilt second(bytes);
+        EXPECT_EQ(whole_buffer(*second.handle), std::string(size, '\0'));
+    }
+}
+
+// An image that has the shape asks for no memory, however little the block explains.
+TEST(FlattenTest, LargeImagesWithoutPixelsFillThoseOfTheirShape) {
+    Picture image(ZQ_TYPE_U8, 9000, 9000, 0);
+    Record record = zqtest::grey_record(kText, 9000, 9000, 0, 9000);
+    record.pixels.clear();
+    EXPECT_EQ(Rebuilt(record.bytes()).code, kBadRecord);
+    ZqImageHandle target = image.handle();
+    EXPECT_EQ(unflatten(record.bytes(), &target), 0);
 }
 
 TEST(FlattenTest, PixelsThatNobodyCanDecodeAreLeftOut) {

@@ -77,6 +77,13 @@ TEST(RebuildTest, NamesOfRebuiltImages) {
         EXPECT_EQ(unflatten(record.bytes(), &again), 0);
         EXPECT_EQ(again, first.handle) << "the image of that name";
     }
+    Record record(flattened(source.handle(), kPlain, 0, kNew, 1));
+    record.name = "lamp2";
+    const Rebuilt known(record.bytes());
+    record.name += std::string("\0b", 2);
+    ZqImageHandle same = nullptr;
+    EXPECT_EQ(unflatten(record.bytes(), &same), 0);
+    EXPECT_EQ(same, known.handle) << "a name ends at a zero byte";
     Record oldest = zqtest::grey_record(kOld, 5, 3, 1, 8);
     const Rebuilt made(oldest.bytes());
     ASSERT_EQ(made.code, 0);
@@ -117,6 +124,9 @@ TEST(RebuildTest, PropertiesTravelWithKindOne) {
     EXPECT_EQ(ZqGetBitDepth(made.handle, &bits), 0);
     EXPECT_EQ(bits, 0);
     EXPECT_EQ(Record(flattened(made.handle, kPlain)).words[zqtest::kSetting], 0x55AAU);
+    ZqImageHandle refilled = made.handle;
+    ASSERT_EQ(unflatten(zqtest::grey_record(kOld, 5, 3, 1, 8).bytes(), &refilled), 0);
+    EXPECT_EQ(Record(flattened(refilled, kPlain)).words[zqtest::kSetting], 0U) << "it has none";
 }
 
 // An object of a sibling library: a number that takes four bytes.
