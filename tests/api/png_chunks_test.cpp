@@ -252,6 +252,7 @@ TEST_F(PngChunksTest, Background) {
         {ZQ_TYPE_RGBU64, false, {1, 2, 300, 0, 0, {}}, bytes({0, 1, 0, 2, 1, 44})},
         {ZQ_TYPE_U8, true, {}, bytes({9})},
         {ZQ_TYPE_U8, true, {255, 250, 255, 0, 0, {}}, bytes({0})},
+        {ZQ_TYPE_U8, true, {800, 0, 0, 0, 0, {}}, bytes({9})},
     };
     for (const Case& c : cases) {
         Picture picture(c.type, 2, 2);

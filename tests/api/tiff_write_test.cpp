@@ -48,8 +48,8 @@ TEST_F(TiffWriteTest, WritesCalibrationsThatAreLengths) {
         if (c.expected == 0) continue;
         const Samples x = file.fields[282].values, y = file.fields[283].values;
         EXPECT_EQ(file.fields[296].values, Samples{c.expected});
-        EXPECT_FLOAT_EQ(static_cast<float>(x[0]) / static_cast<float>(x[1]), c.x);
-        EXPECT_FLOAT_EQ(static_cast<float>(y[0]) / static_cast<float>(y[1]), c.y);
+        EXPECT_EQ(static_cast<double>(x[0]) / x[1], c.x);
+        EXPECT_EQ(static_cast<double>(y[0]) / y[1], c.y);
     }
 }
 
