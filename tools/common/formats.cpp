@@ -4,7 +4,8 @@
 
 #include <algorithm>
 #include <array>
-#include <filesystem>
+
+#include "paths.h"
 
 namespace {
 
@@ -51,7 +52,7 @@ const Format* find_format(std::string_view name) {
 }
 
 const Format* format_of_path(const std::string& path) {
-    const std::string given = std::filesystem::path(path).extension().string();
+    const std::string given = text_of(path_of(path).extension());
     std::string_view extension = given;
     for (const Alias& alias : kAliases)
         if (equal_but_for_case(alias.extension, given)) extension = alias.usual;

@@ -6,20 +6,11 @@
 #include <vector>
 
 #include "formats.h"
+#include "paths.h"
 
 namespace fs = std::filesystem;
 
 namespace {
-
-// Names are UTF-8 everywhere; of plain characters the standard library would think otherwise.
-fs::path path_of(const std::string& text) {
-    return {std::u8string(text.begin(), text.end())};
-}
-
-std::string text_of(const fs::path& path) {
-    const std::u8string text = path.u8string();
-    return {text.begin(), text.end()};
-}
 
 // A name that is no text is no image's: nothing here could open it.
 bool names_image(const fs::path& name) {

@@ -13,6 +13,7 @@
 #include "failure.h"
 #include "formats.h"
 #include "output_file.h"
+#include "paths.h"
 #include "picture.h"
 #include "streams.h"
 
@@ -68,8 +69,8 @@ const Format& output_format(const Options& options) {
 
 std::string output_of(const Options& options, const Format& format, const std::string& file) {
     if (options.folder.empty()) return options.output;
-    const std::string stem = file == kStandardStream ? "stdin" : fs::path(file).stem().string();
-    return (fs::path(options.folder) / (stem + format.extension)).string();
+    const std::string stem = file == kStandardStream ? "stdin" : text_of(path_of(file).stem());
+    return text_of(path_of(options.folder) / path_of(stem + format.extension));
 }
 
 // Two inputs must not become one output; found before anything is written.
@@ -128,7 +129,7 @@ int run(const Options& options, bool quiet) {
     refuse_collisions(options, format);
     return run_batch(options.files, quiet, [&](const std::string& file) {
         std::error_code error;
-        if (!options.folder.empty()) fs::create_directories(options.folder, error);
+        if (!options.folder.empty()) fs::create_directories(path_of(options.folder), error);
         if (error) throw Failure(error, options.folder);
         convert(file, options, format);
         return std::string();

@@ -54,7 +54,7 @@ TemporaryFolder::TemporaryFolder() {
     do {
         path_ = parent / random_name();
     } while (!fs::create_directory(path_, error) && !error);
-    if (error) throw Failure(error, path_.string());
+    if (error) throw Failure(error, text_of(path_));
     fs::permissions(path_, fs::perms::owner_all, error);
 }
 
@@ -113,9 +113,9 @@ ByteOutput::ByteOutput(const std::string& name) : name_(name_for_reports(name)) 
         return;
     }
     std::error_code error;
-    const fs::file_status status = fs::status(name, error);
+    const fs::file_status status = fs::status(path_of(name), error);
     if (fs::is_regular_file(status) || !fs::exists(status))
-        beside_ = (fs::path(name).parent_path() / random_name()).string();
+        beside_ = text_of(path_of(name).parent_path() / random_name());
     stream_ = std::fopen((beside_.empty() ? name_ : beside_).c_str(), "wb");
     if (stream_ != nullptr) return;
     beside_.clear();
@@ -136,7 +136,7 @@ void ByteOutput::commit() {
     if ((stream == stdout ? std::fflush(stream) : std::fclose(stream)) != 0) fail_with_errno(name_);
     if (beside_.empty()) return;
     std::error_code error;
-    fs::rename(beside_, name_, error);
+    fs::rename(path_of(beside_), path_of(name_), error);
     if (error) throw Failure(error, name_);
     beside_.clear();
 }

@@ -12,6 +12,8 @@
 #include <string>
 #include <vector>
 
+#include "paths.h"
+
 constexpr const char* kStandardStream = "-";
 
 // What a message calls an output.
@@ -25,7 +27,7 @@ class TemporaryFolder {
     TemporaryFolder& operator=(const TemporaryFolder&) = delete;
     ~TemporaryFolder();
 
-    std::string file(const std::string& name) const { return (path_ / name).string(); }
+    std::string file(const std::string& name) const { return text_of(path_ / name); }
 
   private:
     std::filesystem::path path_;
