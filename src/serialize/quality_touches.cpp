@@ -61,14 +61,14 @@ double total_of(std::span<const PixelError> errors) {
                            [](double sum, const PixelError& e) { return sum + e.squared; });
 }
 
-double touched_part(std::span<const PixelError> errors, PixelType type, int quality) {
-    const double total = total_of(errors);
-    return total > 0 ? std::min(quality * part_of(total, errors.size(), type), 1.0) : 1.0;
+double touched_part(double total, std::size_t pixels, PixelType type, int quality) {
+    return total > 0 ? std::min(quality * part_of(total, pixels, type), 1.0) : 1.0;
 }
 
 std::span<PixelError> choose_touches(std::span<PixelError> errors, PixelType type, int quality) {
-    const double part = touched_part(errors, type, quality);
-    return part < 1 ? errors.first(take_up_to(errors, part * total_of(errors))) : errors;
+    const double total = total_of(errors);
+    const double part = touched_part(total, errors.size(), type, quality);
+    return part < 1 ? errors.first(take_up_to(errors, part * total)) : errors;
 }
 
 void put_touches(Bytes& out, const Image& image, std::span<PixelError> errors, int quality) {

@@ -16,8 +16,9 @@ struct PixelError {
 };
 double total_of(std::span<const PixelError> errors);
 
-// The part of the squared error that a quality's touches take away, or a little less; 0 to 1.
-double touched_part(std::span<const PixelError> errors, PixelType type, int quality);
+// The part of the squared error, of `total` in so many pixels, that a quality's touches take away,
+// or a little less; 0 to 1.
+double touched_part(double total, std::size_t pixels, PixelType type, int quality);
 
 // The pixels that a quality tells exactly; they are moved to the front of `errors`.
 std::span<PixelError> choose_touches(std::span<PixelError> errors, PixelType type, int quality);
