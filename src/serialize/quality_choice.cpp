@@ -24,18 +24,17 @@ constexpr std::int64_t kMostDoubted = std::int64_t{1} << 20;
 constexpr std::int64_t kMostTouched = std::int64_t{1} << 12;
 
 // How far back lower qualities are tried: where the error grows as evenly as it does in
-// photographs, `least_back` and until it is kClearlyWorse times the best; where it does not, until
+// photographs, `least_back` and until it is `enough` times the best; where it does not, until
 // it is `far` times the best, and to the lowest in small images, where colours that clip may make
 // some low quality exact.
 constexpr std::int64_t kMostSearched = std::int64_t{1} << 15;
-constexpr double kClearlyWorse = 1.1;
 struct Evenness {
     double least_ratio, most_ratio;  // from one quality to the next
-    double far;
+    double enough, far;
     int least_back;
 };
-constexpr Evenness kJpeg = {1, 1.3, 2, 2};
-constexpr Evenness kWavelets = {1.015, 1.12, 8, 4};
+constexpr Evenness kJpeg = {1, 1.3, 1.25, 2, 2};
+constexpr Evenness kWavelets = {1.015, 1.12, 1.1, 8, 4};
 // Where the lowest quality comes nearer than that, nothing can be relied on.
 constexpr double kSurelyWorse = 1.5;
 // What a sample says of the whole is not exact.
@@ -153,7 +152,7 @@ bool search(Trials& trials, const Image& image, int quality) {
         is_even =
             is_even && total > limits.least_ratio * above && total < limits.most_ratio * above;
         const bool is_near = quality - lower < limits.least_back;
-        const double enough = is_even ? kClearlyWorse : far;
+        const double enough = is_even ? limits.enough : far;
         if (!(is_even && is_near) && total > enough * trials.best_total()) break;
         above = total;
     }

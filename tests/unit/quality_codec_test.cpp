@@ -204,28 +204,34 @@ TEST(QualityCodecTest, PicturesGetTruerWithEveryQuality) {
     }
 }
 
-// Larger than what is tried as a whole, with parts that only some of the sampled strips meet.
+// Larger than what is always tried as a whole: soft parts that only some of the sampled strips
+// meet, and stripes, of which a sample does not tell the best quality.
 TEST(QualityCodecTest, SampledPicturesGetTruerToo) {
-    constexpr double kSlack = 0.002;  // dB: the sample is not the whole
+    struct Case {
+        const char* name;
+        Paint paint;
+        int first;
+    };
+    const Case cases[] = {
+        {"soft", soft, 40},
+        {"stripes", [](int x, int y, int i) { return double((x + y + i) / 7 % 2); }, 1}};
     for (const int type : {ZQ_TYPE_U8, ZQ_TYPE_RGB}) {
-        const auto image = make({type, 1101, 203, 0});
-        paint(*image, soft);
-        double last = 0;
-        for (int quality = 40; quality <= 60; ++quality) {
-            const double now = psnr(*image, *round_trip(*image, quality));
-            EXPECT_NE(now, last) << type << ' ' << quality;
-            EXPECT_GT(now, last - kSlack) << type << ' ' << quality;
-            last = now;
+        for (const Case& c : cases) {
+            const auto image = make({type, 1101, 203, 0});
+            paint(*image, c.paint);
+            double last = 0;
+            for (int quality = c.first; quality <= c.first + 20; ++quality) {
+                const double now = psnr(*image, *round_trip(*image, quality));
+                EXPECT_GT(now, last) << type << ' ' << c.name << ' ' << quality;
+                last = now;
+            }
         }
     }
 }
 
-TEST(QualityCodecTest, OtherPicturesHardlyGetWorse) {
+TEST(QualityCodecTest, OtherPicturesDoNotGetWorse) {
     constexpr Picture kPictures[] = {
         {"gradient", gradient, 103, 57}, {"noise", noise, 103, 57}, {"text", text, 103, 57}};
-    // In decibels: repeated patterns have errors that add up farther than lower qualities are
-    // tried.
-    constexpr double kSlack = 1;
     for (int type = 0; type < 7; ++type) {
         for (const Picture& picture : kPictures) {
             const auto image = make({type, picture.width, picture.height, 0});
@@ -233,7 +239,7 @@ TEST(QualityCodecTest, OtherPicturesHardlyGetWorse) {
             double last = 0;
             for (int quality = 1; quality <= 100; quality += zqtest::kThorough ? 3 : 11) {
                 const double now = psnr(*image, *round_trip(*image, quality));
-                ASSERT_GE(now, last - kSlack) << type << ' ' << picture.name << ' ' << quality;
+                ASSERT_GE(now, last) << type << ' ' << picture.name << ' ' << quality;
                 last = now;
             }
             EXPECT_GE(last, 45) << type << ' ' << picture.name;
