@@ -62,7 +62,7 @@ typedef struct ZqWriteOptions {
 typedef struct ZqRawParameters {
     int32_t present; /* not 0: the file is read by these parameters and not probed */
     int32_t format;
-    int32_t dataOffset; /* bytes from the start of the file */
+    int32_t dataOffset; /* bytes from the start of the file; below 0: -1074395989 */
     int32_t layoutMode;
     int32_t layout[2]; /* used in layout mode 2 only */
     int32_t byteOrder; /* 0 little-endian, 1 big-endian */
@@ -161,10 +161,11 @@ ZQ_API ZqError ZQ_CALL ZqWriteFileByCode(const char* path, ZqImageHandle image,
  * or 0; a write does the reverse with the steps rounded and kept within 1 to 65535. PNG and TIFF of
  * 16-bit grey become I16; unsigned samples above 32767 come through with all samples moved down by
  * 32768 (see ZqGetSampleOffset); a write to TIFF or lossless JPEG 2000 gives the file's samples
- * back, one to PNG lets them begin at 0 and says by how much. Of a TIFF the first
- * page is read and turned as its orientation says; grey of 9 to 15 bits becomes I16 with that bit
- * depth, grey of 32 and 64 bits float; CMYK, YCbCr and CIE L*a*b* become RGB; a resolution becomes
- * the calibration (unit 8 inch, 4 centimetre). path         borrowed; empty or null: -1074395989.
+ * back, one to PNG keeps the values: when some are negative, the samples begin at 0 and the file
+ * says where the values do. Of a TIFF the first page is read and turned as its orientation says;
+ * grey of 9 to 15 bits becomes I16 with that bit depth, grey of 32 and 64 bits float; CMYK, YCbCr
+ * and CIE L*a*b* become RGB; a resolution becomes the calibration (unit 8 inch, 4 centimetre).
+ * path         borrowed; empty or null: -1074395989.
  * raw          borrowed; may be null. With parameters present the file is read by them:
  *              -1074396074 for an image without pixels.
  * typeName     written unless null: the type's name, padded with blanks to 8 characters; "xxx" when

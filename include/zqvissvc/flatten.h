@@ -74,8 +74,8 @@ ZQ_API ZqError ZQ_CALL DF_FlattenImageToString(const ZqImageValue* image, ZqStri
  * value mean the image that was flattened (its name and image word are written). Else the image
  * takes size, border, type and pixels of the record; extra information is dropped. A record whose
  * codec does not exist, or that holds no pixels, does not write any: they are undefined when the
- * shape changes, and zeros in a new image. -1074395960 also for
- * a record that asks for far more pixels than its own length can explain. */
+ * shape changes, and zeros in a new image. -1074395960 also for a record that asks for far more
+ * pixels than its own length can explain, unless the image has that shape already. */
 ZQ_API ZqError ZQ_CALL DF_UnflattenImageFromString(ZqImageValue* image, ZqStringHandle string,
                                                    ZqErrorCluster* error);
 

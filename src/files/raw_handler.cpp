@@ -51,7 +51,7 @@ void RawFileHandler::read_lines(Image& image) {
         const bool is_last = i + 1 == target_.height;
         input().read(line.data(), is_last ? line_bytes() : line.size(), kUnableToReadData);
         swap_samples({line.data(), line_bytes()}, layout_.swapped_bytes);
-        above_signed = above_signed || any_above_signed(line.data(), line_bytes() / 2 * 2);
+        above_signed = above_signed || any_above_signed(line.data(), line_bytes());
         const std::int32_t y = layout_.is_bottom_up ? target_.height - 1 - i : i;
         unpack_raw_row(layout_, line.data(), image.row(y), static_cast<std::size_t>(target_.width));
     }

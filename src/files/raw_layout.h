@@ -24,7 +24,7 @@ struct RawLayout {
 };
 
 // Throws kInvalidFileHeader for a format number that does not exist, kInvalidParameter for a
-// negative offset or stride.
+// negative stride, kUnableToReadData for a negative offset, where no file has bytes.
 RawLayout raw_layout(const ZqRawParameters& parameters);
 
 }  // namespace zq

@@ -124,9 +124,8 @@ class Image final : public Object {
     void set_setting(std::int32_t setting) { setting_ = setting; }
     std::int32_t setting() const { return setting_; }
 
-    // What was subtracted from a 16-bit file's samples when the image was read (0, or negative):
-    // value = sample + offset. A writer uses it again where it fits, so that a file's samples
-    // survive a round trip.
+    // What reading added to a 16-bit file's samples: value = sample + offset. The writers of TIFF
+    // and lossless JPEG 2000 take it away again, so that a file's samples survive a round trip.
     void set_sample_offset(std::int32_t offset) { sample_offset_ = offset; }
     std::int32_t sample_offset() const { return sample_offset_; }
 

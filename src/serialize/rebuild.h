@@ -26,8 +26,8 @@ struct RebuildSource {
 // Rebuilds the destination, or makes a new image when it is not a live one, and returns the image;
 // the one that the context refers to, if it does. All that can fail comes before any image is
 // touched: kInitializationError for a context that is not valid, a reference that means no live
-// image, or an image far larger than the pixel block can explain; kInvalidImageType, kNullPointer,
-// whatever a resize throws.
+// image, or memory far beyond what the pixel block can explain (the destination's own does not
+// count); kInvalidImageType, kNullPointer, whatever a resize throws.
 Created rebuild(ImageHandle destination, RebuildSource source);
 
 }  // namespace zq

@@ -6,8 +6,8 @@
 #include <filesystem>
 #include <string>
 
+// Both throw std::filesystem::filesystem_error for what is no text, on Windows.
 std::filesystem::path path_of(const std::string& name);
-// Throws std::filesystem::filesystem_error for a path that is no text, which Windows allows.
 std::string text_of(const std::filesystem::path& path);
 
 #endif

@@ -5,6 +5,7 @@
 #include <zqvissvc/errors.h>
 
 #include <cstdio>
+#include <filesystem>
 #include <new>
 #include <system_error>
 
@@ -71,6 +72,8 @@ int run_batch(const std::vector<std::string>& files, bool quiet,
             fmt::print("{}", text);
         } catch (const Failure& failure) {
             fail(failure.file().empty() ? files[i] : failure.file(), failure.code());
+        } catch (const std::filesystem::filesystem_error& error) {  // a name that is no text
+            fail(files[i], Failure(error.code()).code());
         } catch (const std::bad_alloc&) {
             fail(files[i], ZQ_ERR_NOT_ENOUGH_MEMORY);
         }
