@@ -81,6 +81,7 @@ class ToolFolder : public ScratchFolder {
     // The pixels as `zqvis dump` gives them; empty when it fails.
     std::string dump(const std::string& name) const {
         const Outcome outcome = run("dump @" + name + " -o -");
+        EXPECT_EQ(outcome.status, 0) << name << ": " << outcome.err;
         return outcome.status == 0 ? outcome.out : std::string();
     }
 
