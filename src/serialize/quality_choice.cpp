@@ -53,10 +53,7 @@ class Trials {
 
     // The squared error that is left; the best quality so far is kept, of equal ones the first.
     double attempt(int quality) {
-        Bytes payload;
-        put_payload(payload, sample_.picture(), quality);
-        StreamReader reader(payload);
-        read_payload(reader, *result_, PixelMemory::kUsed);
+        Bytes payload = made(quality);
         const double total = left_after_touches();
         if (quality != touches_) least_of_others_ = std::min(least_of_others_, total);
         if (best_.quality == 0 || total < margin_ * best_total_) {
@@ -66,6 +63,13 @@ class Trials {
             if (sample_.is_whole()) best_.payload = std::move(payload);
         }
         return total;
+    }
+
+    // Without a comparison; of a sample that is not the whole.
+    void accept(int quality) {
+        made(quality);
+        best_.quality = quality;
+        result_.swap(best_result_);
     }
 
     double best_total() const { return best_total_; }
@@ -90,6 +94,15 @@ class Trials {
         image->reinitialise(
             {.type = record.type, .width = record.width, .height = record.height, .border = 0});
         return image;
+    }
+
+    // The payload, which result_ is decoded from.
+    Bytes made(int quality) const {
+        Bytes payload;
+        put_payload(payload, sample_.picture(), quality);
+        StreamReader reader(payload);
+        read_payload(reader, *result_, PixelMemory::kUsed);
+        return payload;
     }
 
     double left_after_touches() const {
@@ -166,9 +179,9 @@ QualityChoice choose_quality(const Image& image, int quality) {
     Trials trials(sample, quality);
     const bool is_jpeg = is_jpeg_type(image.type());
     const bool is_large = pixels_of(image) > kMostDoubted;
-    if (is_jpeg && is_large) {
+    if (is_jpeg && is_large && !sample.is_whole()) {
         // Steps of JPEG divide, so that hardly any picture gets worse; trials would take too long.
-        trials.attempt(quality);
+        trials.accept(quality);
         return trials.take();
     }
     const bool is_even = search(trials, image, quality);
