@@ -180,7 +180,8 @@ QualityChoice choose_quality(const Image& image, int quality) {
     const bool is_jpeg = is_jpeg_type(image.type());
     const bool is_large = pixels_of(image) > kMostDoubted;
     if (is_jpeg && is_large && !sample.is_whole()) {
-        // Steps of JPEG divide, so that hardly any picture gets worse; trials would take too long.
+        // Trials would take too long. Photographs do without, as the steps of JPEG divide; drawn
+        // patterns may get worse.
         trials.accept(quality);
         return trials.take();
     }

@@ -15,8 +15,8 @@ namespace zq {
 // filled up with zeros where the pixels need less. A reader can refuse what announces more.
 inline constexpr std::uint64_t kMostExpansion = 900;
 
-// The image proper of any type and size; `quality` is 1 to 100. Fidelity never falls with rising
-// quality, up to what rounding and clipping of pixels does. Throws kNotEnoughMemory,
+// The image proper of any type and size; `quality` is 1 to 100. Fidelity rises with the
+// quality; docs/quality-codec.md says where it may fall by a little. Throws kNotEnoughMemory,
 // std::bad_alloc.
 std::vector<std::uint8_t> compress_pixels(const Image& image, int quality);
 
