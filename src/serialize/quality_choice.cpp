@@ -7,6 +7,7 @@
 #include <string_view>
 #include <vector>
 
+#include "serialize/quality_blocks.h"
 #include "serialize/quality_errors.h"
 #include "serialize/quality_payload.h"
 #include "serialize/quality_sample.h"
@@ -19,8 +20,8 @@ namespace {
 constexpr std::int64_t kMostWhole = std::int64_t{1} << 17;
 // Up to here they are tried as a whole where a sample does not tell.
 constexpr std::int64_t kMostDoubted = std::int64_t{1} << 20;
-// Of images up to here the touches are chosen, not only their share, as single pixels decide which
-// quality is the truest.
+// Of images up to here, and where every block is tried once, the touches are chosen, not only their
+// share, as single pixels decide which quality is the truest.
 constexpr std::int64_t kMostTouched = std::int64_t{1} << 12;
 
 // How far back lower qualities are tried: where the error grows as evenly as it does in
@@ -35,11 +36,15 @@ struct Evenness {
 };
 constexpr Evenness kJpeg = {1, 1.3, 1.25, 2, 2};
 constexpr Evenness kWavelets = {1.015, 1.12, 1.1, 8, 4};
+// The squared error of a sample up to which rounding has its part in it.
+constexpr double kRounding = 2;
 // Where the lowest quality comes nearer than that, nothing can be relied on.
 constexpr double kSurelyWorse = 1.5;
-// What a sample says of the whole is not exact.
-constexpr double kSampleMargin = 0.98;
 constexpr double kSurelyTruer = 1.05;
+
+const std::uint8_t* at(const Image& image, std::int32_t x, std::int32_t y) {
+    return image.row(y) + x * bytes_per_pixel(image.type());
+}
 
 class Trials {
   public:
@@ -56,7 +61,7 @@ class Trials {
         Bytes payload = made(quality);
         const double total = left_after_touches();
         if (quality != touches_) least_of_others_ = std::min(least_of_others_, total);
-        if (best_.quality == 0 || total < margin_ * best_total_) {
+        if (best_.quality == 0 || total < sample_.confidence() * best_total_) {
             best_total_ = total;
             best_.quality = quality;
             result_.swap(best_result_);
@@ -65,11 +70,12 @@ class Trials {
         return total;
     }
 
-    // Without a comparison; of a sample that is not the whole.
-    void accept(int quality) {
+    // Without a comparison; of a sample that is not exact. The squared error, touches not counted.
+    double accept(int quality) {
         made(quality);
         best_.quality = quality;
         result_.swap(best_result_);
+        return errors_in(*best_result_).total;
     }
 
     double best_total() const { return best_total_; }
@@ -105,31 +111,45 @@ class Trials {
         return payload;
     }
 
+    // Over all that the sample stands for, without touches.
+    Errors errors_in(const Image& result) const {
+        Errors all;
+        for (const SamplePart& part : sample_.parts()) {
+            Errors errors;
+            for (std::int32_t y = part.y; y < part.y + part.height; ++y) {
+                measure_.add_row(at(sample_.picture(), part.x, y), at(result, part.x, y),
+                                 part.width, errors);
+            }
+            all.total += part.count * errors.total;
+            all.pixels += errors.pixels;
+        }
+        return all;
+    }
+
     double left_after_touches() const {
         const PixelType type = result_->type();
-        if (is_touched_) {
-            std::vector<PixelError> errors = errors_of(*result_);
-            return total_of(errors) - total_of(choose_touches(errors, type, touches_));
+        const Errors errors = errors_in(*result_);
+        if (!is_touched_) {
+            return errors.total * (1 - touched_part(errors.total, errors.pixels, type, touches_));
         }
-        const Image& picture = sample_.picture();
-        Errors errors;
-        for (std::int32_t y = 0; y < picture.record().height; ++y) {
-            measure_.add_row(picture.row(y), result_->row(y), picture.record().width, errors);
-        }
-        return errors.total * (1 - touched_part(errors.total, errors.pixels, type, touches_));
+        std::vector<PixelError> pixels = errors_of(*result_);
+        return errors.total - total_of(choose_touches(pixels, type, touches_));
     }
 
     std::vector<PixelError> errors_of(const Image& result) const {
-        const Image& picture = sample_.picture();
-        const std::ptrdiff_t step = bytes_per_pixel(picture.type());
+        const std::ptrdiff_t step = bytes_per_pixel(result.type());
         std::vector<PixelError> errors;
-        for (std::int32_t y = 0; y < picture.record().height; ++y) {
-            const std::uint8_t* from = picture.row(y);
-            const std::uint8_t* back = result.row(y);
-            for (std::int32_t x = 0; x < picture.record().width; ++x) {
-                const double squared = measure_.squared(from + x * step, back + x * step);
-                if (squared == 0) continue;
-                errors.push_back({sample_.index_of(x, y), squared});
+        for (const SamplePart& part : sample_.parts()) {
+            std::uint64_t index = part.index;
+            for (std::int32_t y = part.y; y < part.y + part.height; ++y) {
+                const std::uint8_t* from = at(sample_.picture(), part.x, y);
+                const std::uint8_t* back = at(result, part.x, y);
+                for (std::int32_t x = 0; x < part.width; ++x) {
+                    const double squared = measure_.squared(from + x * step, back + x * step);
+                    if (squared == 0) continue;
+                    errors.push_back({index + static_cast<std::uint64_t>(x), squared});
+                }
+                index += sample_.image_width();
             }
         }
         return errors;
@@ -138,8 +158,8 @@ class Trials {
     const QualitySample& sample_;
     const int touches_;
     const ErrorMeasure measure_;
-    const bool is_touched_ = pixels_of(sample_.picture()) <= kMostTouched;
-    const double margin_ = sample_.is_whole() ? 1 : kSampleMargin;
+    const bool is_touched_ =
+        (sample_.is_exact() && !sample_.is_whole()) || pixels_of(sample_.picture()) <= kMostTouched;
     std::unique_ptr<Image> result_;
     std::unique_ptr<Image> best_result_;
     QualityChoice best_{};
@@ -148,11 +168,11 @@ class Trials {
 };
 
 // Whether the error fell as evenly as it does in photographs.
-bool search(Trials& trials, const Image& image, int quality) {
+bool search(Trials& trials, const QualitySample& sample, int quality) {
     double above = trials.attempt(quality);
-    const std::int64_t pixels = pixels_of(image);
-    const Evenness& limits = is_jpeg_type(image.type()) ? kJpeg : kWavelets;
-    const bool to_the_lowest = pixels <= kMostSearched;
+    const Image& picture = sample.picture();
+    const Evenness& limits = is_jpeg_type(picture.type()) ? kJpeg : kWavelets;
+    const bool to_the_lowest = sample.is_exact() && pixels_of(picture) <= kMostSearched;
     const double far = to_the_lowest ? std::numeric_limits<double>::infinity() : limits.far;
     bool is_even = true;
     if (to_the_lowest && quality > 1) {
@@ -172,27 +192,44 @@ bool search(Trials& trials, const Image& image, int quality) {
     return is_even;
 }
 
+QualityChoice best_of(const QualitySample& sample, int quality) {
+    Trials trials(sample, quality);
+    search(trials, sample, quality);
+    return trials.take();
+}
+
+double samples_of(const Image& image) {
+    const int channels = image.type() == PixelType::kU8 ? 1 : 3;
+    return static_cast<double>(pixels_of(image)) * channels;
+}
+
+QualityChoice choose_large_jpeg(const Image& image, int quality) {
+    const QualitySample strips = QualitySample::strips_of(image);
+    if (!different_blocks(strips.picture()).empty()) {
+        if (const auto blocks = QualitySample::blocks_of(image)) return best_of(*blocks, quality);
+    }
+    // More trials would take too long. Photographs do without, as the steps of JPEG divide.
+    Trials trials(strips, quality);
+    const double error = trials.accept(quality);
+    const bool is_nearly_exact = error < kRounding * samples_of(strips.picture());
+    if (!is_nearly_exact && !has_few_values(strips.picture())) return trials.take();
+    return best_of(QualitySample::lattice_of(image), quality);
+}
+
 }  // namespace
 
 QualityChoice choose_quality(const Image& image, int quality) {
-    const QualitySample sample(image, kMostWhole);
-    Trials trials(sample, quality);
     const bool is_jpeg = is_jpeg_type(image.type());
     const bool is_large = pixels_of(image) > kMostDoubted;
-    if (is_jpeg && is_large && !sample.is_whole()) {
-        // Trials would take too long. Photographs do without, as the steps of JPEG divide; drawn
-        // patterns may get worse.
-        trials.accept(quality);
-        return trials.take();
-    }
-    const bool is_even = search(trials, image, quality);
+    if (pixels_of(image) <= kMostWhole) return best_of(QualitySample::whole_of(image), quality);
+    if (is_jpeg && is_large) return choose_large_jpeg(image, quality);
+    const QualitySample sample = QualitySample::strips_of(image);
+    Trials trials(sample, quality);
+    const bool is_even = search(trials, sample, quality);
     const bool is_clear =
         is_jpeg ? trials.is_truest_by(kSurelyTruer) : is_even && trials.is_truest_by(1);
-    if (sample.is_whole() || is_large || is_clear) return trials.take();
-    const QualitySample whole(image, kMostDoubted);
-    Trials again(whole, quality);
-    search(again, image, quality);
-    return again.take();
+    if (is_large || is_clear) return trials.take();
+    return best_of(QualitySample::whole_of(image), quality);
 }
 
 }  // namespace zq

@@ -1,9 +1,14 @@
-// What qualities are tried on.
+// What qualities are tried on: an image, or a small picture that stands for it.
 #pragma once
 
 #include <cstdint>
+#include <memory>
+#include <optional>
+#include <span>
+#include <vector>
 
 #include "image/image.h"
+#include "serialize/quality_blocks.h"
 
 namespace zq {
 
@@ -11,30 +16,51 @@ inline std::int64_t pixels_of(const Image& image) {
     return std::int64_t{image.record().width} * image.record().height;
 }
 
-// The image itself, or a small picture of parts of it: for JPEG four strips of whole blocks, spread
-// from the top left to the bottom right; else one rectangle from the middle. Borrows the image.
+// A rectangle of the picture, and what it stands for.
+struct SamplePart {
+    std::int32_t x, y, width, height;
+    std::uint64_t index;  // of its first pixel in the image: y * width + x
+    double count;         // how many times the image has it
+};
+
+// Borrows the image.
 class QualitySample {
   public:
-    // Images of up to `most_whole` pixels are taken as a whole.
-    QualitySample(const Image& image, std::int64_t most_whole);
+    static QualitySample whole_of(const Image& image);
 
-    bool is_whole() const { return is_whole_; }
-    const Image& picture() const { return is_whole_ ? image_ : part_; }
-    // In the image, of a pixel of the picture.
-    std::uint64_t index_of(std::int32_t x, std::int32_t y) const;
+    // Parts of the image: for JPEG four strips of whole blocks, spread from the top left to the
+    // bottom right; else one rectangle from the middle.
+    static QualitySample strips_of(const Image& image);
+
+    // For JPEG, whose blocks come out the same wherever they stand: each different block of the
+    // image once. Nothing where half of them or many are different, as in photographs.
+    static std::optional<QualitySample> blocks_of(const Image& image);
+
+    // For JPEG: blocks from all over the image, eight times as many as in the strips.
+    static QualitySample lattice_of(const Image& image);
+
+    const Image& picture() const { return part_ ? *part_ : image_; }
+    std::uint64_t image_width() const { return static_cast<std::uint64_t>(image_.record().width); }
+    std::span<const SamplePart> parts() const { return parts_; }
+    bool is_whole() const { return part_ == nullptr; }
+    // Of an error of the picture, what the image's is surely below; 1 where they are the same.
+    double confidence() const { return confidence_; }
+    bool is_exact() const { return confidence_ == 1; }
 
   private:
-    struct Corner {
-        std::int32_t x, y;
-    };
-    Corner corner_of(std::int32_t strip) const;
-    void copy() const;
+    static QualitySample mosaic(const Image& image, std::span<const JpegBlock> blocks,
+                                double confidence);
+    QualitySample(const Image& image, std::unique_ptr<Image> part, std::vector<SamplePart> parts,
+                  double confidence)
+        : image_(image),
+          part_(std::move(part)),
+          parts_(std::move(parts)),
+          confidence_(confidence) {}
 
     const Image& image_;
-    Image part_;
-    bool is_whole_ = true;
-    std::int32_t strips_ = 1;
-    std::int32_t strip_height_ = 1;
+    std::unique_ptr<Image> part_;
+    std::vector<SamplePart> parts_;
+    double confidence_;
 };
 
 }  // namespace zq
