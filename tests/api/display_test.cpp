@@ -77,6 +77,8 @@ TEST(Display, RefusesInOrderAndDrawsNothingForImpossibleRectangles) {
                   c.expected)
             << c.left << ' ' << c.top << ' ' << c.width << ' ' << c.height << ' ' << c.flags;
     }
+    constexpr int32_t kFar = 1 << 30;
+    EXPECT_EQ(Gen_PlotImageToDC(canvas.handle, kGrey, 0, kFar, 1, kFar - 1, 0, kFar, 1), 0U);
     EXPECT_EQ(canvas.row(0), (Row{0, 0}));
     EXPECT_EQ(ZqDisposeCanvas(&canvas), ZQ_ERR_NOT_AN_OBJECT);
     ZqDeviceContext none = nullptr;
