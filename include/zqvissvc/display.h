@@ -76,7 +76,8 @@ ZQ_API uint32_t ZQ_CALL Gen_GetImageClientPos(ZqWindow window, int32_t x, int32_
 
 /* Fills a rectangle behind an image, brush origin at its top-left corner.
  * rectangle   logical units; the mapping is one-to-one without origins afterwards.
- * excluded    not painted; null: none. Afterwards it belongs to the clip region.
+ * excluded    not painted, its corners in any order; null: none. Afterwards it belongs to the clip
+ * region.
  * colour, backgroundColour  0x00BBGGRR.
  * brushStyle  0 plain; 1 none; 2 hatched with `hatch` (0 to 5); 3 and 5 to 8 the button-face
  * pattern.

@@ -164,7 +164,9 @@ TEST(Display, ShrinksToTheFirstRowAndTheLastColumnOfEachGroup) {
 TEST(Display, PaintsEveryBrushButTheExcludedRectangle) {
     for (const int32_t style : {0, 1, 2, 3, 4, 5, 6, 7, 8, 9}) {
         TestCanvas canvas(4, 4);
-        const ZqCoordinates whole = {0, 0, 4, 4}, hole = {1, 0, 3, 4};
+        const ZqCoordinates whole = {0, 0, 4, 4};
+        const ZqCoordinates hole =
+            style % 2 == 0 ? ZqCoordinates{1, 0, 3, 4} : ZqCoordinates{3, 4, 1, 0};  // backwards
         const auto paint = [&](const ZqCoordinates* area, const ZqCoordinates* excluded) {
             return DrawImageBackground2(canvas.handle, area, excluded, 0x0A0B0C, 0x0D0E0F, style,
                                         1);
