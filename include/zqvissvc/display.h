@@ -27,7 +27,8 @@ enum {
 /* Draws a rectangle of a buffer at one-to-one scale.
  * pixels          borrowed; top + height rows of exactly left + width pixels each, without padding.
  * left, top, width, height  the rectangle in the buffer, in pixels. Nothing is drawn for an empty
- * one, one that starts before the buffer, and one too large for memory.
+ * one, one too large for memory, and one that starts before the buffer, unless (x, y) is (left, top)
+ * and what the clip box leaves of it does not.
  * x, y            logical units; where the rectangle's top-left pixel goes.
  * flags           see above.
  * Returns 0, also when the system refuses to draw; else, found in this order,
