@@ -106,6 +106,26 @@ TEST(Display, ZoomsOverThePattern) {
     EXPECT_EQ(canvas.row(2), (Row{255, 255, 240, 240, 255, 255, 240, 240}));
 }
 
+TEST(Display, AnImageWithoutPixelsIsZoomedLikeOthers) {
+    ZqImageHandle image = nullptr;
+    ASSERT_EQ(NewImage(ZQ_TYPE_U8, 0, 0, 0, &image), 0);
+    for (const bool buffer : {false, true}) {
+        TestCanvas canvas(8, 3);
+        const ZqCoordinates clip = {2, 1, 8, 3};
+        ZqSetCanvasClip(canvas.handle, &clip);
+        EXPECT_EQ(buffer ? static_cast<ZqError>(
+                               Gen_PlotZoomedImage(nullptr, kGrey, 2, 0, 2, 0, 0, 0, canvas.handle))
+                         : ZqDrawImage(nullptr, image, 2, 0, 0, 0, canvas.handle),
+                  0);
+        EXPECT_EQ(canvas.row(0), Row(8));
+        EXPECT_EQ(canvas.row(1), (Row{0, 0, 240, 240, 240, 240, 240, 240}));
+        ZqCoordinates place = {};
+        EXPECT_EQ(Gen_GetImageClientPos(canvas.handle, 6, 4, 0, 0, &place), 0U);
+        EXPECT_EQ(place.left, 3);
+    }
+    EXPECT_EQ(ZqDisposeImage(image), 0);
+}
+
 TEST(Display, ClippedDrawsShowWhatWholeOnesShowThere) {
     // In place as bytes, mapped as samples.
     std::vector<uint16_t> pixels(20 * 20);
