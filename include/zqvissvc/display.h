@@ -27,7 +27,8 @@ enum {
 /* Draws a rectangle of a buffer at one-to-one scale.
  * pixels          borrowed; top + height rows of exactly left + width pixels each, without padding.
  * left, top, width, height  the rectangle in the buffer, in pixels. Nothing is drawn for an empty
- * one, one that starts before the buffer, and one too large for memory.
+ * one, one too large for memory, and one that starts before the buffer, unless (x, y) is (left, top)
+ * and what the clip box leaves of it does not.
  * x, y            logical units; where the rectangle's top-left pixel goes.
  * flags           see above.
  * Returns 0, also when the system refuses to draw; else, found in this order,
@@ -76,7 +77,8 @@ ZQ_API uint32_t ZQ_CALL Gen_GetImageClientPos(ZqWindow window, int32_t x, int32_
 
 /* Fills a rectangle behind an image, brush origin at its top-left corner.
  * rectangle   logical units; the mapping is one-to-one without origins afterwards.
- * excluded    not painted; null: none. Afterwards it belongs to the clip region.
+ * excluded    not painted, its corners in any order; null: none. Afterwards it belongs to the clip
+ * region.
  * colour, backgroundColour  0x00BBGGRR.
  * brushStyle  0 plain; 1 none; 2 hatched with `hatch` (0 to 5); 3 and 5 to 8 the button-face
  * pattern.

@@ -8,11 +8,11 @@
  * 1 quality (compressed with losses; docs/quality-codec.md), 2 packed (one bit a pixel: not 0).
  * Kinds: 0 by value, 1 by value with properties, 2 by reference (only for this process).
  *
- * Host strings are counted; a record is appended at the string's old length. Protocol of error
- * clusters, image references and threads as in image.h. Any function may also give -1074396159 (no
- * memory); a string that could not grow is what it was, and an image that could not be rebuilt too.
- * Lines of a caller's buffer that are shorter than its rows can not be flattened plain
- * (-1074395960).
+ * Host strings are counted; a record is appended at the string's old length, which is 0 in a block
+ * too small for its count. Protocol of error clusters, image references and threads as in image.h.
+ * Any function may also give -1074396159 (no memory); a string that could not grow is what it was,
+ * and an image that could not be rebuilt too. Lines of a caller's buffer that are shorter than its
+ * rows can not be flattened plain (-1074395960).
  *
  * Codes: -1074395960 a record or version that is not valid, -1074395956 a quality outside 0 to
  * 1000, -1074395704 a codec id that does not exist, -1074395703 a kind outside 0 to 2. */

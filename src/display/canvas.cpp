@@ -43,6 +43,13 @@ std::int32_t scale(std::int32_t value, std::int32_t from, std::int32_t numerator
     return clamp((twice >= 0 ? twice : twice - whole + 1) / whole + to);
 }
 
+// The system's regions take the corners of a box in any order.
+Box in_order(const Box& box) {
+    const auto [left, right] = std::minmax(box.left, box.right);
+    const auto [top, bottom] = std::minmax(box.top, box.bottom);
+    return {left, top, right, bottom};
+}
+
 // What is left of a box without another one: at most four boxes.
 void subtract(const Box& box, const Box& hole, std::vector<Box>& rest) {
     const Box cut = intersect(box, hole);
@@ -127,13 +134,13 @@ Box Canvas::to_device(const Box& logical) {
 
 void Canvas::exclude_clip(const Box& device) {
     std::vector<Box> rest;
-    for (const Box& box : clip_) subtract(box, device, rest);
+    for (const Box& box : clip_) subtract(box, in_order(device), rest);
     clip_ = std::move(rest);
 }
 
 void Canvas::include_clip(const Box& device) {
     exclude_clip(device);
-    const Box added = intersect(device, bounds());
+    const Box added = intersect(in_order(device), bounds());
     if (!added.empty()) clip_.push_back(added);
 }
 

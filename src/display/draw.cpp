@@ -27,6 +27,13 @@ bool lies_inside(const Box& source, const PixelView& view) {
            source.bottom <= view.height && !source.empty();
 }
 
+// The same part of a box seen upside down: its rows lie as far from the other end.
+Box upside_down(const Box& part, const Box& whole) {
+    const std::int64_t top = std::int64_t{whole.top} + whole.bottom - part.bottom;
+    return {part.left, static_cast<std::int32_t>(top), part.right,
+            static_cast<std::int32_t>(top + part.height())};
+}
+
 // Every tile is a bitmap of its own, as high as its band; seen upside down, the last rows are the
 // first band.
 void stretch_tiles(DeviceContext& dc, const Dib& dib, const Box& source, const Box& destination) {
@@ -109,11 +116,8 @@ void draw(DeviceContext& dc, const PixelView& view, const Box& source_box,
         source = intersect(source, inflate(dc.clip_box(), window.x > viewport.x ? 1 : 0,
                                            window.y > viewport.y ? 1 : 0));
         destination = source;
-        // Seen upside down, the visible rows are those at the other end of the box.
-        if (options.bottom_up) {
-            source.top = source_box.top + (source_box.bottom - destination.bottom);
-            source.bottom = source.top + (destination.bottom - destination.top);
-        }
+        if (source.empty()) return;
+        if (options.bottom_up) source = upside_down(destination, source_box);
     }
     if (!lies_inside(source, view)) return;
     Scratch scratch;

@@ -98,8 +98,8 @@ void draw_image(DeviceContext& dc, ImageHandle image, const ZoomedPlace& place,
     } catch (GRLIBError_enum) {
         return;
     }
-    std::optional<PixelView> view = PixelView::of(**locked);
-    if (view->pixels == nullptr || view->width < 1 || view->height < 1) view.reset();
+    PixelView view = PixelView::of(**locked);
+    if (view.pixels == nullptr) view.width = view.height = 0;
     draw_zoomed(dc, view, place, options);
 }
 
@@ -169,7 +169,10 @@ uint32_t ZQ_CALL Gen_PlotZoomedImage(ZqWindow window, const void* pixels, int32_
         const Target target = target_of(window, dc);
         DeviceContext& context = target.require();
         std::optional<PixelView> view;
-        if (pixels != nullptr) view = buffer_view(view_for_flags(flags), pixels, width, height);
+        if (pixels != nullptr) {
+            // Without pixels it is an image still: of 0 x 0.
+            view = buffer_view(view_for_flags(flags), pixels, width, height).value_or(PixelView{});
+        }
         draw_silently([&] {
             draw_zoomed(context, view, place_in(window, zoom, {xOffset, yOffset}),
                         options_for((flags & kBottomUp) != 0));

@@ -11,8 +11,11 @@ namespace zq {
 
 namespace {
 
-// A component of full size has a block for 64 pixels, and a block takes a bit at least.
+// A component of full size has a block for 64 pixels, and a block takes a bit at least; but
+// arithmetic coding spends nearly nothing on empty blocks, so such pictures may have that many
+// pixels whatever the file's size.
 constexpr std::uint64_t kMostPixelsAByte = 512;
+constexpr std::uint64_t kFreeArithmeticPixels = std::uint64_t{1} << 24;
 // Each scan may cost a walk over the whole picture, however few bytes it has. Far more than any
 // encoder makes.
 constexpr int kMostScans = 500;
@@ -83,6 +86,7 @@ void JpegReader::read_info() {
 void JpegReader::check_plausible() {
     if (file_.size() == InputFile::kUnknownSize) return;
     const std::uint64_t pixels = std::uint64_t{jpeg().image_width} * jpeg().image_height;
+    if (jpeg().arith_code != FALSE && pixels <= kFreeArithmeticPixels) return;
     if (pixels / kMostPixelsAByte > static_cast<std::uint64_t>(file_.size())) {
         throw kUnableToReadData;
     }

@@ -26,9 +26,9 @@ void unpack_565(const std::uint8_t* line, std::uint8_t* row, std::size_t pixels)
     for (std::size_t x = 0; x < pixels; ++x, line += 2, row += 4) {
         std::uint16_t value;
         std::memcpy(&value, line, sizeof value);
-        row[0] = static_cast<std::uint8_t>((value & 31U) * 255 / 31);
-        row[1] = static_cast<std::uint8_t>((value >> 5U & 63U) * 255 / 63);
-        row[2] = static_cast<std::uint8_t>((value >> 11U) * 255 / 31);
+        row[0] = static_cast<std::uint8_t>(((value & 31U) * 255 + 15) / 31);
+        row[1] = static_cast<std::uint8_t>(((value >> 5U & 63U) * 255 + 31) / 63);
+        row[2] = static_cast<std::uint8_t>(((value >> 11U) * 255 + 15) / 31);
         row[3] = 0;
     }
 }

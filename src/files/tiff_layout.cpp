@@ -39,7 +39,8 @@ constexpr std::array kCodecs = {
 constexpr std::uint32_t kWidestFaxRow = 131072;
 constexpr int kMostBits = 64;
 
-// A tile larger than the picture must not be larger than this.
+// A tile above this must be no larger than the picture, or explained by the file's size as pictures
+// are.
 constexpr std::uint64_t kLargestSpareTile = std::uint64_t{16} << 20;
 
 const Codec& codec_of(std::uint16_t compression) {
@@ -173,30 +174,37 @@ bool is_supported(const TiffLayout& layout) {
     }
 }
 
+// The most bytes that a byte of the file can stand for; 0 for fax, which knows no such bound.
+std::uint64_t expansion_of(const TiffLayout& layout) {
+    // Subsampled colour is what expands most easily.
+    return codec_of(layout.compression).expansion *
+           (layout.colour == TiffColour::kForeign ? std::uint64_t{3} : 1);
+}
+
 // No picture that the file's bytes cannot make, whatever its tags announce.
 void check_plausible(const TiffLayout& layout, const TiffSession& session) {
     const std::uint64_t size = session.file_size();
-    const Codec& codec = codec_of(layout.compression);
-    if (codec.expansion == 0) {
+    const std::uint64_t expansion = expansion_of(layout);
+    if (expansion == 0) {
         if (layout.height / 8 > size || layout.width > kWidestFaxRow) throw kUnableToReadData;
         return;
     }
     const int planes = layout.separate ? layout.samples : 1;
     const std::uint64_t bytes =
         checked_mul<std::uint64_t>(layout.row_bytes(layout.width), layout.height);
-    // Subsampled colour is what expands most easily.
-    const std::uint64_t expansion =
-        codec.expansion * (layout.colour == TiffColour::kForeign ? std::uint64_t{3} : 1);
     if (checked_mul<std::uint64_t>(bytes, static_cast<std::uint64_t>(planes)) / expansion > size)
         throw kUnableToReadData;
 }
 
-void check_tiles(const TiffLayout& layout, TIFF* tiff) {
+void check_tiles(const TiffLayout& layout, const TiffSession& session) {
     if (!layout.tiled) return;
-    const auto tile = static_cast<std::uint64_t>(TIFFTileSize(tiff));
+    const auto tile = static_cast<std::uint64_t>(TIFFTileSize(session.tiff()));
     if (tile == 0) throw kInvalidFileHeader;
     const std::uint64_t picture = layout.row_bytes(layout.width) * layout.height;
-    if (tile > std::max(picture, kLargestSpareTile)) throw kUnableToReadData;
+    if (tile <= std::max(picture, kLargestSpareTile)) return;
+    // Tiles are filled up to their size, also the only one of a picture.
+    const std::uint64_t expansion = expansion_of(layout);
+    if (expansion == 0 || tile / expansion > session.file_size()) throw kUnableToReadData;
 }
 
 }  // namespace
@@ -274,7 +282,7 @@ TiffLayout read_tiff_layout(const TiffSession& session) {
         throw kInvalidFileHeader;
     layout.alpha = alpha_of(tiff, layout);
     check_plausible(layout, session);
-    check_tiles(layout, tiff);
+    check_tiles(layout, session);
     return layout;
 }
 

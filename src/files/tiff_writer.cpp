@@ -3,7 +3,6 @@
 
 #include <algorithm>
 #include <array>
-#include <cmath>
 #include <cstring>
 #include <optional>
 
@@ -84,7 +83,8 @@ std::optional<Resolution> resolution_of(const Calibration& calibration) {
         static_cast<std::uint16_t>(inch ? RESUNIT_INCH : RESUNIT_CENTIMETER),
         static_cast<float>(steps / calibration.x_step),
         static_cast<float>(steps / calibration.y_step)};
-    const auto usable = [](float value) { return std::isnormal(value) && value > 0; };
+    // The file has rationals of 32-bit numbers.
+    const auto usable = [](float value) { return value > 0x1p-32F && value < 0x1p32F; };
     if (!usable(resolution.x) || !usable(resolution.y)) return std::nullopt;
     return resolution;
 }

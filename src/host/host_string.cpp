@@ -7,9 +7,12 @@
 
 #include "base/checked.h"
 #include "host/host_array.h"
+#include "host/services.h"
 
 namespace zq::host {
 namespace {
+
+constexpr std::size_t kCountBytes = sizeof(std::int32_t);
 
 bool is_plainly_empty(ZqStringHandle string) {
     return string == nullptr || (*string != nullptr && (*string)->length == 0);
@@ -21,8 +24,8 @@ std::uint8_t* resize_string(ZqStringHandle* target, std::size_t length) {
     ZqHandle handle = reinterpret_cast<ZqHandle>(*target);
     std::uint8_t* block = resize_array(ElementType::kU8, 1, &handle, length);
     *target = reinterpret_cast<ZqStringHandle>(handle);
-    std::memcpy(block, &count, sizeof count);
-    return block + sizeof count;
+    std::memcpy(block, &count, kCountBytes);
+    return block + kCountBytes;
 }
 
 }  // namespace
@@ -31,6 +34,14 @@ std::string_view view(ZqStringHandle string) {
     if (string == nullptr || *string == nullptr || (*string)->length < 0) return {};
     return {reinterpret_cast<const char*>((*string)->bytes),
             static_cast<std::size_t>((*string)->length)};
+}
+
+std::string_view view_in_block(ZqStringHandle string) {
+    if (string == nullptr) return {};
+    const auto size = ds_block_size(reinterpret_cast<ZqHandle>(string));
+    if (size && *size < kCountBytes) return {};
+    const std::string_view text = view(string);
+    return size && text.size() > *size - kCountBytes ? std::string_view() : text;
 }
 
 void set_string(ZqStringHandle* target, std::string_view text) {
@@ -52,7 +63,7 @@ void copy_string(ZqStringHandle* target, ZqStringHandle source) {
 
 std::uint8_t* extend_string(ZqStringHandle* target, std::size_t bytes, Extension extension) {
     if (target == nullptr) throw kNullPointer;
-    const std::size_t kept = extension == Extension::kAppend ? view(*target).size() : 0;
+    const std::size_t kept = extension == Extension::kAppend ? view_in_block(*target).size() : 0;
     return resize_string(target, checked_add(kept, bytes)) + kept;
 }
 

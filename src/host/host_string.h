@@ -13,6 +13,9 @@ namespace zq::host {
 // host call.
 std::string_view view(ZqStringHandle string);
 
+// The same, empty when its block has no room for it: a new block holds no length yet.
+std::string_view view_in_block(ZqStringHandle string);
+
 // Makes *target (a null handle is given a block) hold the text, which must not lie in host memory.
 // Throws kNullPointer for a null target and kNotEnoughMemory; the string then is what it was.
 void set_string(ZqStringHandle* target, std::string_view text);

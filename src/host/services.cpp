@@ -3,6 +3,7 @@
 
 #include <zqvissvc/slots.h>
 
+#include <algorithm>
 #include <type_traits>
 
 #include "host/module.h"
@@ -48,6 +49,12 @@ std::int32_t ds_set_handle_size(ZqHandle handle, std::int32_t size) {
 }
 std::int32_t ds_get_handle_size(ZqHandle handle) {
     return g_ds_get_handle_size.call_or(0, handle);
+}
+std::optional<std::size_t> ds_block_size(ZqHandle handle) {
+    const ZqCheckHandleProc check = g_ds_check_handle.find();
+    const ZqGetHandleSizeProc size_of = g_ds_get_handle_size.find();
+    if (check == nullptr || size_of == nullptr || check(handle) != 0) return std::nullopt;
+    return static_cast<std::size_t>(std::max(size_of(handle), 0));
 }
 std::int32_t ds_check_handle(ZqHandle handle) {
     return g_ds_check_handle.call_or(kHostOutOfMemory, handle);

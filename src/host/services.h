@@ -7,6 +7,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <optional>
 
 #include "host/binding.h"
 
@@ -52,6 +53,9 @@ inline constinit Service<ZqUnregisterSessionProc> ud_unregister_session{"UDUnreg
 inline constinit Service<ZqSetCleanupProcProc> rt_set_cleanup_proc{"RTSetCleanupProc"};
 inline constinit Service<ZqNativeDialogProc> native_dialog_setup{"WNativeDialogSetup"};
 inline constinit Service<ZqNativeDialogProc> native_dialog_restore{"WNativeDialogRestore"};
+
+// Bytes of a DS block; none for what the host does not take for one, or when it lacks the services.
+std::optional<std::size_t> ds_block_size(ZqHandle handle);
 
 // Any function that the host module exports, or null.
 void* find_session_service(const char* name);

@@ -77,6 +77,8 @@ TEST(Display, RefusesInOrderAndDrawsNothingForImpossibleRectangles) {
                   c.expected)
             << c.left << ' ' << c.top << ' ' << c.width << ' ' << c.height << ' ' << c.flags;
     }
+    constexpr int32_t kFar = 1 << 30;
+    EXPECT_EQ(Gen_PlotImageToDC(canvas.handle, kGrey, 0, kFar, 1, kFar - 1, 0, kFar, 1), 0U);
     EXPECT_EQ(canvas.row(0), (Row{0, 0}));
     EXPECT_EQ(ZqDisposeCanvas(&canvas), ZQ_ERR_NOT_AN_OBJECT);
     ZqDeviceContext none = nullptr;
@@ -102,6 +104,26 @@ TEST(Display, ZoomsOverThePattern) {
     EXPECT_EQ(place.bottom, 3);
     EXPECT_EQ(Gen_PlotZoomedImage(canvas.handle, nullptr, 2, 3, 2, 0, 0, 12, nullptr), 0U);
     EXPECT_EQ(canvas.row(2), (Row{255, 255, 240, 240, 255, 255, 240, 240}));
+}
+
+TEST(Display, AnImageWithoutPixelsIsZoomedLikeOthers) {
+    ZqImageHandle image = nullptr;
+    ASSERT_EQ(NewImage(ZQ_TYPE_U8, 0, 0, 0, &image), 0);
+    for (const bool buffer : {false, true}) {
+        TestCanvas canvas(8, 3);
+        const ZqCoordinates clip = {2, 1, 8, 3};
+        ZqSetCanvasClip(canvas.handle, &clip);
+        EXPECT_EQ(buffer ? static_cast<ZqError>(
+                               Gen_PlotZoomedImage(nullptr, kGrey, 2, 0, 2, 0, 0, 0, canvas.handle))
+                         : ZqDrawImage(nullptr, image, 2, 0, 0, 0, canvas.handle),
+                  0);
+        EXPECT_EQ(canvas.row(0), Row(8));
+        EXPECT_EQ(canvas.row(1), (Row{0, 0, 240, 240, 240, 240, 240, 240}));
+        ZqCoordinates place = {};
+        EXPECT_EQ(Gen_GetImageClientPos(canvas.handle, 6, 4, 0, 0, &place), 0U);
+        EXPECT_EQ(place.left, 3);
+    }
+    EXPECT_EQ(ZqDisposeImage(image), 0);
 }
 
 TEST(Display, ClippedDrawsShowWhatWholeOnesShowThere) {
@@ -162,7 +184,9 @@ TEST(Display, ShrinksToTheFirstRowAndTheLastColumnOfEachGroup) {
 TEST(Display, PaintsEveryBrushButTheExcludedRectangle) {
     for (const int32_t style : {0, 1, 2, 3, 4, 5, 6, 7, 8, 9}) {
         TestCanvas canvas(4, 4);
-        const ZqCoordinates whole = {0, 0, 4, 4}, hole = {1, 0, 3, 4};
+        const ZqCoordinates whole = {0, 0, 4, 4};
+        const ZqCoordinates hole =
+            style % 2 == 0 ? ZqCoordinates{1, 0, 3, 4} : ZqCoordinates{3, 4, 1, 0};  // backwards
         const auto paint = [&](const ZqCoordinates* area, const ZqCoordinates* excluded) {
             return DrawImageBackground2(canvas.handle, area, excluded, 0x0A0B0C, 0x0D0E0F, style,
                                         1);

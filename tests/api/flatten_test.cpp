@@ -16,6 +16,8 @@
 #include "tests/support/picture.h"
 #include "tests/support/record.h"
 
+extern "C" int32_t DSSetHandleSize(ZqHandle handle, int32_t size);
+
 namespace {
 
 using zqtest::Cluster;
@@ -105,6 +107,19 @@ TEST(FlattenTest, AppendsExactlyOneRecord) {
     refhost::refuse("NumericArrayResize");
     EXPECT_EQ(FlattenImageToArray1D(picture.handle(), string.out()), kNoMemory);
     EXPECT_EQ(string.text(), once + once) << "a string that could not grow";
+}
+
+TEST(FlattenTest, BlocksTooSmallForTheirStringAreEmpty) {
+    const Picture picture(ZQ_TYPE_U8, 3, 2, 0);
+    const std::string record = flattened(picture.handle(), kPlain, 0, kText);
+    for (const int32_t size : {0, 3, 4, 6}) {
+        refhost::String string("abc");
+        ASSERT_EQ(DSSetHandleSize(reinterpret_cast<ZqHandle>(string.get()), size), 0);
+        ZqImageHandle none = nullptr;
+        EXPECT_EQ(UnflattenImageFromArray1D(&none, string.get()), kBadRecord);
+        ASSERT_EQ(FlattenImageToArray1D(picture.handle(), string.out()), 0);
+        EXPECT_EQ(string.text(), record) << size << " bytes";
+    }
 }
 
 // What a codec makes of a pixel of another image, for codecs that are exact.

@@ -85,6 +85,7 @@ TEST_F(JpegFilesTest, ReadsEveryLayout) {
                               f.v_sampling = 1;
                           })},
         {"progressive", with({}, [](auto& f) { f.progressive = true; })},
+        {"arithmetic coding", with({}, [](auto& f) { f.arithmetic = true; })},
         {"restart markers", with({}, [](auto& f) { f.restart = 1; })},
         {"stored as RGB", with({},
                                [](auto& f) {
@@ -278,9 +279,13 @@ TEST_F(JpegFilesTest, TellsDamageFromOddities) {
     shape.restart = 0;
     shape.progressive = true;
     const std::string progressive = bare_bytes(shape);
-    const size_t frame = find_marker(file, 0xC0), jfif = find_marker(file, 0xE0),
-                 restart = file.find("\xFF\xD3"), last_scan = progressive.rfind("\xFF\xDA"),
-                 end = file.size() - 2;
+    BareJpeg drawing = {.width = 2000, .height = 2000, .arithmetic = true};
+    drawing.samples.assign(size_t{2000} * 2000 * 3, 'w');
+    zqtest::write_bare_jpeg(path_, drawing);
+    const std::string blank = load_bytes(path_);
+    const size_t frame = find_marker(file, 0xC0), blank_frame = find_marker(blank, 0xC9),
+                 jfif = find_marker(file, 0xE0), restart = file.find("\xFF\xD3"),
+                 last_scan = progressive.rfind("\xFF\xDA"), end = file.size() - 2;
     const auto changed = [](std::string bytes, size_t at, size_t count, const std::string& by) {
         return bytes.replace(at, count, by);
     };
@@ -302,6 +307,9 @@ TEST_F(JpegFilesTest, TellsDamageFromOddities) {
         {"no code", changed(file, restart + 2, 6, std::string("\xFF\0\xFF\0\xFF\0", 6)),
          kUnreadable},
         {"60000 by 60000", changed(file, frame + 1, 4, "\xEA\x60\xEA\x60"), kUnreadable},
+        {"a blank drawing", blank, 0},
+        {"the same, 60000 by 60000", changed(blank, blank_frame + 1, 4, "\xEA\x60\xEA\x60"),
+         kUnreadable},
         {"12 bits", changed(file, frame, 1, "\x0C"), kBadHeader},
         {"no width", changed(file, frame + 3, 2, std::string(2, '\0')), kBadHeader},
         {"unknown coding", changed(file, frame - 3, 1, "\xC3"), kBadHeader},

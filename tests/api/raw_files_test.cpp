@@ -72,7 +72,7 @@ TEST_F(RawFilesTest, EveryFormatInBothByteOrders) {
          "\0\x80\2\x80\3\x80\4\x80\5\x80\xFF\x7F"s},
         {5, ZQ_TYPE_I16, 6, 2, twelve, twelve},
         {6, ZQ_TYPE_RGB, 7, 2, "\x1F\0\xE0\x07\0\xF8\xFF\xFF\0\0\x10\0"s,
-         "\xFF\0\0\0\0\xFF\0\0\0\0\xFF\0\xFF\xFF\xFF\0\0\0\0\0\x83\0\0\0"s},
+         "\xFF\0\0\0\0\xFF\0\0\0\0\xFF\0\xFF\xFF\xFF\0\0\0\0\0\x84\0\0\0"s},
         {7, ZQ_TYPE_RGB, 8, 1, "abcdefghijklmnopqr", alpha_added},
         {8, ZQ_TYPE_RGB, 8, 1, "abcdefghijklmnopqr", planes_joined},
         {9, ZQ_TYPE_SGL, 10, 4, "\1\0\0\0\2\0\0\0\0\0\0\x80\3\0\0\0\4\0\0\0\5\0\0\0"s,

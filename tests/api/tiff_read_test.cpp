@@ -346,6 +346,27 @@ TEST_F(TiffReadTest, RefusesDamagedAndForeignFiles) {
     }
 }
 
+// Tiles are filled up, also the only one of a picture, which is then larger than the picture.
+TEST_F(TiffReadTest, ReadsOneLargeTile) {
+    constexpr uint32_t kSide = 4112;
+    Bytes tile(size_t{kSide} * kSide, '\x21');
+    const auto width = static_cast<int32_t>(kSide - 9);
+    tile[static_cast<size_t>(width) - 1] = '\x42';
+    BareTiff file = bare_tiff(kSide - 9, 2, 1, {8});
+    file.tiled = true;
+    file.fields[322].values = file.fields[323].values = {kSide};
+    for (const bool is_deflated : {false, true}) {
+        SCOPED_TRACE(is_deflated);
+        store(with_strip(file, is_deflated ? 8 : 1, is_deflated ? deflated(tile) : tile));
+        Picture target(ZQ_TYPE_U8, 1, 1);
+        ASSERT_EQ(read(target), 0);
+        EXPECT_EQ(target.record().width, width);
+        const Bytes pixels = target.pixels();
+        EXPECT_EQ(pixels.substr(0, static_cast<size_t>(width)),
+                  tile.substr(0, static_cast<size_t>(width)));
+    }
+}
+
 // A small file cannot hold these pictures, so it is refused before any memory is taken for them:
 // each would need more than an image can have, which would be another error.
 TEST_F(TiffReadTest, RefusesPicturesThatTheFileCannotHold) {

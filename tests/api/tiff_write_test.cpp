@@ -35,7 +35,8 @@ TEST_F(TiffWriteTest, WritesCalibrationsThatAreLengths) {
     for (const Case& c :
          {Case{8, 0.005F, 0.25F, 2, 200, 4}, Case{4, 0.5F, 4, 3, 2, 0.25F},
           Case{5, 0.001F, 0.01F, 3, 10, 1}, Case{0, 0.5F, 0.5F, 0, 0, 0}, Case{3, 1, 1, 0, 0, 0},
-          Case{8, 0, 1, 0, 0, 0}, Case{8, 1, -1, 0, 0, 0}, Case{4, kNan, 1, 0, 0, 0}}) {
+          Case{8, 0, 1, 0, 0, 0}, Case{8, 1, -1, 0, 0, 0}, Case{4, kNan, 1, 0, 0, 0},
+          Case{8, 0x1p-32F, 1, 0, 0, 0}, Case{4, 1, 0x1p32F, 0, 0, 0}}) {
         SCOPED_TRACE(testing::Message() << c.unit << ' ' << c.x_step);
         Picture picture(ZQ_TYPE_U8, 1, 1);
         picture.handle()->unit = c.unit;

@@ -17,7 +17,7 @@ struct BareJpeg {
     uint32_t width = 0, height = 0;
     int components = 3;
     J_COLOR_SPACE given = JCS_RGB, stored = JCS_YCbCr;  // of `samples`, and of the file
-    bool progressive = false, adobe_marker = true;
+    bool progressive = false, arithmetic = false, adobe_marker = true;
     unsigned restart = 0;  // blocks between restart markers; 0: none
     int h_sampling = 2, v_sampling = 2;
     std::string samples{};  // interleaved, without padding
@@ -42,6 +42,7 @@ inline void write_bare_jpeg(const std::string& path, BareJpeg& picture) {
     jpeg.comp_info[0].h_samp_factor = picture.h_sampling;
     jpeg.comp_info[0].v_samp_factor = picture.v_sampling;
     jpeg.restart_interval = picture.restart;
+    jpeg.arith_code = picture.arithmetic ? TRUE : FALSE;
     if (picture.progressive) jpeg_simple_progression(&jpeg);
     jpeg_start_compress(&jpeg, TRUE);
     const size_t line = size_t{picture.width} * static_cast<size_t>(picture.components);

@@ -174,19 +174,19 @@ TEST(Gdi, ShowsImagesOfEveryTypeAsACanvasDoes) {
 TEST(Gdi, PaintsBackgroundsAsACanvasDoes) {
     const ZqCoordinates boxes[] = {
         {0, 0, kWidth, kHeight}, {3, 2, 30, 41}, {-5, -3, 20, 19}, {30, 41, 3, 2}};
-    const ZqCoordinates hole = {9, 8, 25, 16};
+    const ZqCoordinates upright = {9, 8, 25, 16}, backwards = {25, 16, 9, 8};
+    const ZqCoordinates* const holes[] = {nullptr, &upright, &backwards};
     for (const ZqCoordinates& clip : kClips) {
         for (const ZqCoordinates& box : boxes) {
             for (int32_t style = 0; style <= 9; ++style) {
                 for (int32_t hatch = 0; hatch < (style == 2 ? 14 : 1); ++hatch) {
-                    for (const bool excluded : {false, true}) {
+                    for (const ZqCoordinates* hole : holes) {
                         compare(clip,
                                 "style " + std::to_string(style) + " hatch " +
                                     std::to_string(hatch) + " box " + std::to_string(box.left),
                                 [&](const auto& screen) {
-                                    return DrawImageBackground2(
-                                               screen.dc(), &box, excluded ? &hole : nullptr,
-                                               0x123456, 0x789ABC, style, hatch) != 0;
+                                    return DrawImageBackground2(screen.dc(), &box, hole, 0x123456,
+                                                                0x789ABC, style, hatch) != 0;
                                 });
                     }
                 }
