@@ -15,8 +15,13 @@ namespace {
 // As many as an image of 2^20 pixels has.
 constexpr std::int64_t kMostBlocks = std::int64_t{1} << 14;
 
-// They are taken even if equal, so that there are enough pixels that touches can differ by.
-constexpr std::size_t kFirst = 128;
+// While there are few, so many that are equal are taken, for touches to have pixels to differ by.
+constexpr std::size_t kFew = 512;
+constexpr int kMostEquals = 16;
+struct Equals {
+    std::size_t last = 0;  // of those taken
+    int taken = 0;
+};
 
 // Two pixels without their alpha, which is no part of a block.
 constexpr std::uint64_t kColours = 0x00FFFFFF00FFFFFF;
@@ -67,16 +72,17 @@ std::vector<JpegBlock> different_blocks(const Image& image) {
     const BlockGrid grid(image);
     const std::int64_t most = std::min(kMostBlocks, grid.size() / 2);
     std::vector<JpegBlock> blocks;
-    std::unordered_map<std::uint64_t, std::size_t> known;
+    std::unordered_map<std::uint64_t, Equals> known;
     for (std::int64_t i = 0; i < grid.size(); ++i) {
         const JpegBlock block = grid[i];
-        const auto [at, is_new] = known.try_emplace(hash_of(image, block), blocks.size());
-        if (is_new && std::ssize(blocks) >= most) return {};
-        if (is_new || blocks.size() < kFirst) {
-            at->second = blocks.size();
+        Equals& equals = known[hash_of(image, block)];
+        if (equals.taken == 0 && std::ssize(blocks) >= most) return {};
+        if (equals.taken == 0 || (equals.taken < kMostEquals && blocks.size() < kFew)) {
+            ++equals.taken;
+            equals.last = blocks.size();
             blocks.push_back(block);
         } else {
-            ++blocks[at->second].count;
+            ++blocks[equals.last].count;
         }
     }
     return blocks;

@@ -17,9 +17,9 @@ struct JpegBlock {
     std::int64_t count;
 };
 
-// In the order in which they come, row by row: the first 128, and of the others each once that is
-// not equal (by a 64-bit hash) to one before. None where more than half of all blocks are
-// different, or more than 2^14.
+// In the order in which they come, row by row, each once that is not equal (by a 64-bit hash) to
+// one before; up to 16 times while there are less than 512. None where more than half of all blocks
+// are different, or more than 2^14.
 std::vector<JpegBlock> different_blocks(const Image& image);
 
 // From all over an image that has at least so many.

@@ -204,25 +204,32 @@ TEST(QualityCodecTest, PicturesGetTruerWithEveryQuality) {
     }
 }
 
+double stripes(int x, int y, int channel) {
+    return (x + y + channel) / 7 % 2;
+}
+double chequers(int x, int y, int) {
+    return (x / 5 + y / 5) % 2;
+}
+
 // Larger than what is always tried as a whole: soft parts that only some of the sampled strips
-// meet, and stripes, of which a sample does not tell the best quality.
+// meet, and stripes, of which a sample does not tell the best quality. Larger still: chequers of
+// few different blocks, and text, where none is like another.
 TEST(QualityCodecTest, SampledPicturesGetTruerToo) {
-    struct Case {
-        const char* name;
-        Paint paint;
-        int first;
-    };
-    const Case cases[] = {
-        {"soft", soft, 40},
-        {"stripes", [](int x, int y, int i) { return double((x + y + i) / 7 % 2); }, 1}};
+    constexpr struct {
+        Picture picture;
+        int first, last;
+    } kCases[] = {{{"soft", soft, 1101, 203}, 40, 60},
+                  {{"stripes", stripes, 1101, 203}, 1, 21},
+                  {{"chequers", chequers, 1201, 901}, 62, 68},
+                  {{"text", text, 1201, 901}, 67, 68}};
     for (const int type : {ZQ_TYPE_U8, ZQ_TYPE_RGB}) {
-        for (const Case& c : cases) {
-            const auto image = make({type, 1101, 203, 0});
-            paint(*image, c.paint);
+        for (const auto& c : kCases) {
+            const auto image = make({type, c.picture.width, c.picture.height, 0});
+            paint(*image, c.picture.paint);
             double last = 0;
-            for (int quality = c.first; quality <= c.first + 20; ++quality) {
+            for (int quality = c.first; quality <= c.last; ++quality) {
                 const double now = psnr(*image, *round_trip(*image, quality));
-                EXPECT_GT(now, last) << type << ' ' << c.name << ' ' << quality;
+                EXPECT_GT(now, last) << type << ' ' << c.picture.name << ' ' << quality;
                 last = now;
             }
         }
