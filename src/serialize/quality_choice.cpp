@@ -20,6 +20,7 @@ namespace {
 constexpr std::int64_t kMostWhole = std::int64_t{1} << 17;
 // Up to here they are tried as a whole where a sample does not tell.
 constexpr std::int64_t kMostDoubted = std::int64_t{1} << 20;
+constexpr std::int64_t kMostDoubtedWavelets = std::int64_t{1} << 21;
 // Of images up to here, and where every block is tried once, the touches are chosen, not only their
 // share, as single pixels decide which quality is the truest.
 constexpr std::int64_t kMostTouched = std::int64_t{1} << 12;
@@ -105,7 +106,7 @@ class Trials {
     // The payload, which result_ is decoded from.
     Bytes made(int quality) const {
         Bytes payload;
-        put_payload(payload, sample_.picture(), quality);
+        put_payload(payload, sample_.picture(), quality, sample_.image());
         StreamReader reader(payload);
         read_payload(reader, *result_, PixelMemory::kUsed);
         return payload;
@@ -220,16 +221,19 @@ QualityChoice choose_large_jpeg(const Image& image, int quality) {
 
 QualityChoice choose_quality(const Image& image, int quality) {
     const bool is_jpeg = is_jpeg_type(image.type());
-    const bool is_large = pixels_of(image) > kMostDoubted;
     if (pixels_of(image) <= kMostWhole) return best_of(QualitySample::whole_of(image), quality);
-    if (is_jpeg && is_large) return choose_large_jpeg(image, quality);
+    if (is_jpeg && pixels_of(image) > kMostDoubted) return choose_large_jpeg(image, quality);
     const QualitySample sample = QualitySample::strips_of(image);
     Trials trials(sample, quality);
     const bool is_even = search(trials, sample, quality);
     const bool is_clear =
         is_jpeg ? trials.is_truest_by(kSurelyTruer) : is_even && trials.is_truest_by(1);
-    if (is_large || is_clear) return trials.take();
-    return best_of(QualitySample::whole_of(image), quality);
+    if (is_clear) return trials.take();
+    if (pixels_of(image) <= (is_jpeg ? kMostDoubted : kMostDoubtedWavelets)) {
+        return best_of(QualitySample::whole_of(image), quality);
+    }
+    const auto tiles = QualitySample::tiles_of(image);
+    return tiles ? best_of(*tiles, quality) : trials.take();
 }
 
 }  // namespace zq

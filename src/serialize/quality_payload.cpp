@@ -6,11 +6,11 @@
 
 namespace zq {
 
-void put_payload(Bytes& out, const Image& image, int quality) {
+void put_payload(Bytes& out, const Image& image, int quality, const Image& whole) {
     if (is_jpeg_type(image.type())) {
         put_jpeg(out, image, quality);
     } else {
-        put_planes_of(out, image, quality);
+        put_planes_of(out, image, quality, whole);
     }
 }
 

@@ -11,8 +11,11 @@ inline bool is_jpeg_type(PixelType type) {
     return type == PixelType::kU8 || type == PixelType::kRgb;
 }
 
-// The image has pixels; quality is 1 to 100.
-void put_payload(Bytes& out, const Image& image, int quality);
+// The image has pixels; quality is 1 to 100. `whole` is what it is a part of, for the range of values.
+void put_payload(Bytes& out, const Image& image, int quality, const Image& whole);
+inline void put_payload(Bytes& out, const Image& image, int quality) {
+    put_payload(out, image, quality, image);
+}
 // Reads up to the end. Throws kInitializationError or kNotEnoughMemory before any pixel changes.
 void read_payload(StreamReader& reader, Image& image, PixelMemory memory);
 

@@ -147,9 +147,9 @@ void clear(const PlaneRows& rows, const PixelRect& rect, std::size_t planes) {
 
 }  // namespace
 
-void put_planes_of(Bytes& out, const Image& image, int quality) {
+void put_planes_of(Bytes& out, const Image& image, int quality, const Image& whole) {
     const PlaneLayout layout = plane_layout(image.type());
-    Plan plan(image.type(), measure(image, layout));
+    Plan plan(image.type(), measure(whole, layout));
     for (std::size_t i = 0; i < layout.ranges; ++i) {
         put_f32(out, plan.ranges[i].low);
         put_f32(out, plan.ranges[i].high);

@@ -7,8 +7,9 @@
 
 namespace zq {
 
-// Images with pixels of any type but U8 and RGB.
-void put_planes_of(Bytes& out, const Image& image, int quality);
+// Images with pixels of any type but U8 and RGB. The range of values is that of `whole`, which
+// the image is a part of.
+void put_planes_of(Bytes& out, const Image& image, int quality, const Image& whole);
 
 // Throws kInitializationError, kNotEnoughMemory, std::bad_alloc; the image is unchanged then.
 void read_planes_of(StreamReader& reader, Image& image);

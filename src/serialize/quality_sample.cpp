@@ -7,6 +7,7 @@
 
 #include "serialize/quality_blocks.h"
 #include "serialize/quality_payload.h"
+#include "serialize/quality_samples.h"
 
 namespace zq {
 
@@ -15,9 +16,10 @@ namespace {
 struct SampleShape {
     std::int32_t width, height, strips;
 };
+constexpr std::int32_t kSampledTiles = 4;
 constexpr std::int64_t kLatticeBlocks = std::int64_t{1} << 12;
 constexpr double kOfStrips = 0.98;
-constexpr double kOfLattice = 0.998;
+constexpr double kOfMany = 0.998;
 constexpr SampleShape kJpegSample = {1024, 32, 4};
 constexpr SampleShape kWaveletSample = {256, 256, 1};
 constexpr auto kSide = static_cast<std::int32_t>(kBlockSide);
@@ -113,6 +115,23 @@ QualitySample QualitySample::mosaic(const Image& image, std::span<const JpegBloc
     return {image, std::move(picture), std::move(parts), confidence};
 }
 
+std::optional<QualitySample> QualitySample::tiles_of(const Image& image) {
+    const ImageRecord& record = image.record();
+    const std::int64_t across = record.width / kTileSide;
+    const std::int64_t tiles = across * (record.height / kTileSide);
+    if (tiles < kSampledTiles) return std::nullopt;
+    auto picture = blank(record.type, kTileSide, kSampledTiles * kTileSide);
+    std::vector<SamplePart> parts;
+    for (std::int32_t i = 0; i < kSampledTiles; ++i) {
+        const std::int64_t at = tiles * (2 * i + 1) / (2 * kSampledTiles);
+        const Corner corner = {static_cast<std::int32_t>(at % across) * kTileSide,
+                               static_cast<std::int32_t>(at / across) * kTileSide};
+        parts.push_back({0, i * kTileSide, kTileSide, kTileSide, corner.index_in(image), 1});
+        copy(image, corner, *picture, parts.back());
+    }
+    return QualitySample(image, std::move(picture), std::move(parts), kOfMany);
+}
+
 std::optional<QualitySample> QualitySample::blocks_of(const Image& image) {
     const std::vector<JpegBlock> blocks = different_blocks(image);
     if (blocks.empty()) return std::nullopt;
@@ -120,7 +139,7 @@ std::optional<QualitySample> QualitySample::blocks_of(const Image& image) {
 }
 
 QualitySample QualitySample::lattice_of(const Image& image) {
-    return mosaic(image, spread_blocks(image, kLatticeBlocks), kOfLattice);
+    return mosaic(image, spread_blocks(image, kLatticeBlocks), kOfMany);
 }
 
 }  // namespace zq

@@ -28,18 +28,22 @@ class QualitySample {
   public:
     static QualitySample whole_of(const Image& image);
 
-    // Parts of the image: for JPEG four strips of whole blocks, spread from the top left to the
-    // bottom right; else one rectangle from the middle.
+    // A small part of the image: for JPEG four strips of whole blocks, spread from the top left to
+    // the bottom right; else one rectangle from the middle.
     static QualitySample strips_of(const Image& image);
 
     // For JPEG, whose blocks come out the same wherever they stand: each different block of the
     // image once. Nothing where half of them or many are different, as in photographs.
     static std::optional<QualitySample> blocks_of(const Image& image);
 
+    // For wavelets: four whole tiles from all over the image. Nothing where it has less.
+    static std::optional<QualitySample> tiles_of(const Image& image);
+
     // For JPEG: blocks from all over the image, eight times as many as in the strips.
     static QualitySample lattice_of(const Image& image);
 
     const Image& picture() const { return part_ ? *part_ : image_; }
+    const Image& image() const { return image_; }
     std::uint64_t image_width() const { return static_cast<std::uint64_t>(image_.record().width); }
     std::span<const SamplePart> parts() const { return parts_; }
     bool is_whole() const { return part_ == nullptr; }
