@@ -11,7 +11,8 @@ inline bool is_jpeg_type(PixelType type) {
     return type == PixelType::kU8 || type == PixelType::kRgb;
 }
 
-// The image has pixels; quality is 1 to 100. `whole` is what it is a part of, for the range of values.
+// The image has pixels; quality is 1 to 100. `whole` is what it is a part of, for the range of its
+// values.
 void put_payload(Bytes& out, const Image& image, int quality, const Image& whole);
 inline void put_payload(Bytes& out, const Image& image, int quality) {
     put_payload(out, image, quality, image);
