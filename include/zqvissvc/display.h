@@ -27,8 +27,8 @@ enum {
 /* Draws a rectangle of a buffer at one-to-one scale.
  * pixels          borrowed; top + height rows of exactly left + width pixels each, without padding.
  * left, top, width, height  the rectangle in the buffer, in pixels. Nothing is drawn for an empty
- * one, one too large for memory, and one that starts before the buffer, unless (x, y) is (left, top)
- * and what the clip box leaves of it does not.
+ * one, one too large for memory, and one that starts before the buffer (unless it goes to (left,
+ * top) and the clip box leaves only what is inside).
  * x, y            logical units; where the rectangle's top-left pixel goes.
  * flags           see above.
  * Returns 0, also when the system refuses to draw; else, found in this order,
