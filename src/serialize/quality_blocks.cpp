@@ -76,7 +76,7 @@ std::vector<JpegBlock> different_blocks(const Image& image) {
     for (std::int64_t i = 0; i < grid.size(); ++i) {
         const JpegBlock block = grid[i];
         Equals& equals = known[hash_of(image, block)];
-        if (equals.taken == 0 && std::ssize(blocks) >= most) return {};
+        if (std::ssize(known) > most) return {};
         if (equals.taken == 0 || (equals.taken < kMostEquals && blocks.size() < kFew)) {
             ++equals.taken;
             equals.last = blocks.size();

@@ -21,7 +21,7 @@ struct QualityChoice {
 };
 
 // `quality`, or a lower one that comes out truer. Images of up to 2^17 pixels are tried as they
-// are, larger ones by a sample of 2^15 or 2^16, and up to 2^20 as they are where it leaves doubt.
+// are, larger ones by samples; docs/quality-codec.md says by which.
 QualityChoice choose_quality(const Image& image, int quality);
 
 }  // namespace zq
