@@ -4,6 +4,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
+#include <optional>
 
 #include "base/checked.h"
 #include "host/host_array.h"
@@ -14,8 +15,17 @@ namespace {
 
 constexpr std::size_t kCountBytes = sizeof(std::int32_t);
 
-bool is_plainly_empty(ZqStringHandle string) {
-    return string == nullptr || (*string != nullptr && (*string)->length == 0);
+// The count that the string's block starts with. None without a block, and in one that has no room
+// for it or for so many bytes: a new block holds no count yet.
+std::optional<std::int32_t> count_of(ZqStringHandle string) {
+    if (string == nullptr || *string == nullptr) return std::nullopt;
+    const auto size = ds_block_size(reinterpret_cast<ZqHandle>(string));
+    if (size && *size < kCountBytes) return std::nullopt;
+    const std::int32_t count = (*string)->length;
+    if (size && count > 0 && static_cast<std::size_t>(count) > *size - kCountBytes) {
+        return std::nullopt;
+    }
+    return count;
 }
 
 // Makes room for `length` bytes and stores the length; returns where the bytes go.
@@ -31,22 +41,14 @@ std::uint8_t* resize_string(ZqStringHandle* target, std::size_t length) {
 }  // namespace
 
 std::string_view view(ZqStringHandle string) {
-    if (string == nullptr || *string == nullptr || (*string)->length < 0) return {};
-    return {reinterpret_cast<const char*>((*string)->bytes),
-            static_cast<std::size_t>((*string)->length)};
-}
-
-std::string_view view_in_block(ZqStringHandle string) {
-    if (string == nullptr) return {};
-    const auto size = ds_block_size(reinterpret_cast<ZqHandle>(string));
-    if (size && *size < kCountBytes) return {};
-    const std::string_view text = view(string);
-    return size && text.size() > *size - kCountBytes ? std::string_view() : text;
+    const std::int32_t count = count_of(string).value_or(0);
+    if (count <= 0) return {};
+    return {reinterpret_cast<const char*>((*string)->bytes), static_cast<std::size_t>(count)};
 }
 
 void set_string(ZqStringHandle* target, std::string_view text) {
     if (target == nullptr) throw kNullPointer;
-    if (text.empty() && is_plainly_empty(*target)) return;
+    if (text.empty() && (*target == nullptr || count_of(*target) == 0)) return;
     std::uint8_t* bytes = resize_string(target, text.size());
     if (!text.empty()) std::memcpy(bytes, text.data(), text.size());
 }
@@ -63,7 +65,7 @@ void copy_string(ZqStringHandle* target, ZqStringHandle source) {
 
 std::uint8_t* extend_string(ZqStringHandle* target, std::size_t bytes, Extension extension) {
     if (target == nullptr) throw kNullPointer;
-    const std::size_t kept = extension == Extension::kAppend ? view_in_block(*target).size() : 0;
+    const std::size_t kept = extension == Extension::kAppend ? view(*target).size() : 0;
     return resize_string(target, checked_add(kept, bytes)) + kept;
 }
 

@@ -9,12 +9,9 @@
 
 namespace zq::host {
 
-// The bytes of a string; empty for a null handle and for a negative length. Valid until the next
-// host call.
+// The bytes of a string; empty for a null handle, a negative count, and a count that its block has
+// no room for (where the host tells sizes). Valid until a host call that may move blocks.
 std::string_view view(ZqStringHandle string);
-
-// The same, empty when its block has no room for it: a new block holds no length yet.
-std::string_view view_in_block(ZqStringHandle string);
 
 // Makes *target (a null handle is given a block) hold the text, which must not lie in host memory.
 // Throws kNullPointer for a null target and kNotEnoughMemory; the string then is what it was.

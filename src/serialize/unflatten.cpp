@@ -15,7 +15,7 @@ namespace zq {
 namespace {
 
 std::span<const std::uint8_t> bytes_of(ZqStringHandle string) {
-    const std::string_view text = host::view_in_block(string);
+    const std::string_view text = host::view(string);
     return {reinterpret_cast<const std::uint8_t*>(text.data()), text.size()};
 }
 
