@@ -16,7 +16,7 @@ namespace {
 constexpr std::int64_t kMostBlocks = std::int64_t{1} << 14;
 
 // While there are few, so many that are equal are taken, for touches to have pixels to differ by.
-constexpr std::size_t kFew = 512;
+constexpr std::size_t kFewBlocks = 512;
 constexpr int kMostEquals = 16;
 struct Equals {
     std::size_t last = 0;  // of those taken
@@ -77,7 +77,7 @@ std::vector<JpegBlock> different_blocks(const Image& image) {
         const JpegBlock block = grid[i];
         Equals& equals = known[hash_of(image, block)];
         if (std::ssize(known) > most) return {};
-        if (equals.taken == 0 || (equals.taken < kMostEquals && blocks.size() < kFew)) {
+        if (equals.taken == 0 || (equals.taken < kMostEquals && blocks.size() < kFewBlocks)) {
             ++equals.taken;
             equals.last = blocks.size();
             blocks.push_back(block);
@@ -96,7 +96,7 @@ std::vector<JpegBlock> spread_blocks(const Image& image, std::int64_t count) {
 }
 
 bool has_few_values(const Image& image) {
-    constexpr std::ptrdiff_t kFew = 32;
+    constexpr std::ptrdiff_t kFewValues = 32;
     std::array<bool, 256> seen{};
     const std::ptrdiff_t pixel = bytes_per_pixel(image.type());
     const std::ptrdiff_t channels = std::min<std::ptrdiff_t>(pixel, 3);  // not alpha
@@ -106,7 +106,7 @@ bool has_few_values(const Image& image) {
             for (std::ptrdiff_t i = 0; i < channels; ++i) seen[at[i]] = true;
         }
     }
-    return std::ranges::count(seen, true) <= kFew;
+    return std::ranges::count(seen, true) <= kFewValues;
 }
 
 }  // namespace zq
