@@ -175,9 +175,10 @@ bool search(Trials& trials, const QualitySample& sample, int quality) {
     const Evenness& limits = is_jpeg_type(picture.type()) ? kJpeg : kWavelets;
     const bool to_the_lowest = sample.is_exact() && pixels_of(picture) <= kMostSearched;
     const double far = to_the_lowest ? std::numeric_limits<double>::infinity() : limits.far;
-    bool is_even = true;
+    // Of few different blocks any quality may be the truest.
+    bool is_even = sample.is_whole() || !to_the_lowest;
     if (to_the_lowest && quality > 1) {
-        is_even = trials.attempt(1) > kSurelyWorse * trials.best_total();
+        is_even = trials.attempt(1) > kSurelyWorse * trials.best_total() && is_even;
     }
     // The lowest has been tried then.
     const int lowest = to_the_lowest ? 2 : 1;
@@ -199,16 +200,16 @@ QualityChoice best_of(const QualitySample& sample, int quality) {
     return trials.take();
 }
 
+bool repeats_itself(const Image& picture) {
+    return !different_blocks(picture).empty();
+}
+
 double samples_of(const Image& image) {
     const int channels = image.type() == PixelType::kU8 ? 1 : 3;
     return static_cast<double>(pixels_of(image)) * channels;
 }
 
-QualityChoice choose_large_jpeg(const Image& image, int quality) {
-    const QualitySample strips = QualitySample::strips_of(image);
-    if (!different_blocks(strips.picture()).empty()) {
-        if (const auto blocks = QualitySample::blocks_of(image)) return best_of(*blocks, quality);
-    }
+QualityChoice choose_large_jpeg(const Image& image, const QualitySample& strips, int quality) {
     // More trials would take too long. Photographs do without, as the steps of JPEG divide.
     Trials trials(strips, quality);
     const double error = trials.accept(quality);
@@ -220,10 +221,15 @@ QualityChoice choose_large_jpeg(const Image& image, int quality) {
 }  // namespace
 
 QualityChoice choose_quality(const Image& image, int quality) {
-    const bool is_jpeg = is_jpeg_type(image.type());
     if (pixels_of(image) <= kMostWhole) return best_of(QualitySample::whole_of(image), quality);
-    if (is_jpeg && pixels_of(image) > kMostDoubted) return choose_large_jpeg(image, quality);
+    const bool is_jpeg = is_jpeg_type(image.type());
     const QualitySample sample = QualitySample::strips_of(image);
+    if (is_jpeg && repeats_itself(sample.picture())) {
+        if (const auto blocks = QualitySample::blocks_of(image)) return best_of(*blocks, quality);
+    }
+    if (is_jpeg && pixels_of(image) > kMostDoubted) {
+        return choose_large_jpeg(image, sample, quality);
+    }
     Trials trials(sample, quality);
     const bool is_even = search(trials, sample, quality);
     const bool is_clear =
