@@ -76,7 +76,8 @@ class Trials {
         made(quality);
         best_.quality = quality;
         result_.swap(best_result_);
-        return errors_in(*best_result_).total;
+        best_.errors = errors_of(*best_result_);
+        return total_of(best_.errors);
     }
 
     double best_total() const { return best_total_; }
@@ -87,7 +88,7 @@ class Trials {
                least_of_others_ >= factor * best_total_;
     }
     QualityChoice take() {
-        best_.errors = errors_of(*best_result_);
+        if (best_.errors.empty()) best_.errors = errors_of(*best_result_);
         if (sample_.is_whole() && best_result_->type() == PixelType::kHsl) {
             best_.crossed_hues = zq::crossed_hues(sample_.picture(), *best_result_);
         }
@@ -140,6 +141,7 @@ class Trials {
     std::vector<PixelError> errors_of(const Image& result) const {
         const std::ptrdiff_t step = bytes_per_pixel(result.type());
         std::vector<PixelError> errors;
+        errors.reserve(static_cast<std::size_t>(pixels_of(result)));
         for (const SamplePart& part : sample_.parts()) {
             std::uint64_t index = part.index;
             for (std::int32_t y = part.y; y < part.y + part.height; ++y) {
