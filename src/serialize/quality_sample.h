@@ -33,7 +33,8 @@ class QualitySample {
     static QualitySample strips_of(const Image& image);
 
     // For JPEG, whose blocks come out the same wherever they stand: each different block of the
-    // image once. Nothing where half of them or many are different, as in photographs.
+    // image, a few times where there are few. Nothing where more than half of all or more than 2^14
+    // are different, as in photographs.
     static std::optional<QualitySample> blocks_of(const Image& image);
 
     // For wavelets: four whole tiles from all over the image. Nothing where it has less.
@@ -47,7 +48,8 @@ class QualitySample {
     std::uint64_t image_width() const { return static_cast<std::uint64_t>(image_.record().width); }
     std::span<const SamplePart> parts() const { return parts_; }
     bool is_whole() const { return part_ == nullptr; }
-    // Of an error of the picture, what the image's is surely below; 1 where they are the same.
+    // An error of the picture that is below this part of another one means that the image's is
+    // smaller too; 1 where the picture tells the image's errors exactly.
     double confidence() const { return confidence_; }
     bool is_exact() const { return confidence_ == 1; }
 
