@@ -22,10 +22,19 @@ HWY_INLINE YccRow behind(const YccRow& row, std::size_t pixels) {
     return {row.y + pixels, row.cb + pixels, row.cr + pixels, row.alpha + pixels};
 }
 
+HWY_INLINE YccTarget behind(const YccTarget& row, std::size_t pixels) {
+    return {row.y + pixels, row.cb + pixels, row.cr + pixels};
+}
+
 #if HWY_TARGET == HWY_SCALAR
 
 void ycc_to_bgra(const YccRow& from, std::uint32_t* to, std::size_t pixels, Stores) {
     scalar::ycc_to_bgra(from, to, pixels);
+}
+
+void bgra_to_ycc(const std::uint32_t* from, const YccTarget& to, std::size_t pixels,
+                 CommonBits& bits) {
+    scalar::bgra_to_ycc(from, to, pixels, bits);
 }
 
 #else
@@ -127,6 +136,107 @@ void ycc_to_bgra(const YccRow& from, std::uint32_t* to, std::size_t pixels, Stor
                 [](Pixel pixel, std::uint32_t* at) HWY_ATTR { hn::Stream(pixel, Pixels(), at); });
 }
 
+using Sums = hn::Repartition<std::int32_t, Words>;
+using Sum = hn::Vec<Sums>;
+using Bytes = hn::Repartition<std::uint8_t, Words>;
+
+// Blue and red of a pixel, and green and alpha, as 16-bit samples.
+struct Pairs {
+    Word blue_red, green_alpha;
+};
+
+HWY_INLINE Pairs pairs_of(Pixel pixel) {
+    const auto words = hn::BitCast(UnsignedWords(), pixel);
+    return {hn::BitCast(Words(), hn::And(words, hn::Set(UnsignedWords(), 0xFF))),
+            hn::BitCast(Words(), hn::ShiftRight<8>(words))};
+}
+
+// Weights of both samples of a pair, the first one's in the lower half.
+HWY_INLINE Word weights(std::int16_t first, std::int16_t second) {
+    const auto low = static_cast<std::uint16_t>(first);
+    const auto high = static_cast<std::uint16_t>(second);
+    return hn::BitCast(Words(), hn::Set(Pixels(), low | std::uint32_t{high} << 16));
+}
+
+constexpr int kHalf = 32768;
+constexpr int kMiddle = (128 << 16) + kHalf - 1;
+
+// Sums in parts of 65536. Green counts twice by half of its weight, which would exceed 16 bits.
+HWY_INLINE Sum luminance(const Pairs& pixel) {
+    const Word half_green = weights(19235, 0);
+    Sum rest = hn::Zero(Sums());
+    Sum sum = hn::Set(Sums(), kHalf);
+    sum = hn::ReorderWidenMulAccumulate(Sums(), pixel.blue_red, weights(7471, 19595), sum, rest);
+    sum = hn::ReorderWidenMulAccumulate(Sums(), pixel.green_alpha, half_green, sum, rest);
+    sum = hn::ReorderWidenMulAccumulate(Sums(), pixel.green_alpha, half_green, sum, rest);
+    return hn::RearrangeToOddPlusEven(sum, rest);
+}
+
+// With all weights of the other sign, as -32768 fits into 16 bits and 32768 does not.
+HWY_INLINE Sum chrominance(const Pairs& pixel, Word blue_red, Word green_alpha) {
+    Sum rest = hn::Zero(Sums());
+    Sum sum = hn::Zero(Sums());
+    sum = hn::ReorderWidenMulAccumulate(Sums(), pixel.blue_red, blue_red, sum, rest);
+    sum = hn::ReorderWidenMulAccumulate(Sums(), pixel.green_alpha, green_alpha, sum, rest);
+    return hn::Sub(hn::Set(Sums(), kMiddle), hn::RearrangeToOddPlusEven(sum, rest));
+}
+
+// Bits 16 to 23 of four vectors.
+template <class Function>
+HWY_INLINE void store_whole_part(const Pairs (&pixels)[4], std::uint8_t* to,
+                                 const Function& function) {
+    const auto upper_words = [&](const Pairs& low, const Pairs& high) HWY_ATTR {
+        return hn::ConcatOdd(Words(), hn::BitCast(Words(), function(high)),
+                             hn::BitCast(Words(), function(low)));
+    };
+    const Word low = upper_words(pixels[0], pixels[1]);
+    const Word high = upper_words(pixels[2], pixels[3]);
+    hn::StoreU(hn::ConcatEven(Bytes(), hn::BitCast(Bytes(), high), hn::BitCast(Bytes(), low)),
+               Bytes(), to);
+}
+
+// Four vectors of pixels make one of bytes for each plane.
+HWY_INLINE void take_apart(const Pixel (&pixels)[4], const YccTarget& to) {
+    const Pairs pairs[] = {pairs_of(pixels[0]), pairs_of(pixels[1]), pairs_of(pixels[2]),
+                           pairs_of(pixels[3])};
+    store_whole_part(pairs, to.y, [](const Pairs& pixel) HWY_ATTR { return luminance(pixel); });
+    store_whole_part(pairs, to.cb, [](const Pairs& pixel) HWY_ATTR {
+        return chrominance(pixel, weights(-32768, 11059), weights(21709, 0));
+    });
+    store_whole_part(pairs, to.cr, [](const Pairs& pixel) HWY_ATTR {
+        return chrominance(pixel, weights(5329, -32768), weights(27439, 0));
+    });
+}
+
+HWY_INLINE std::uint32_t lanes_joined(Pixel pixel, std::uint32_t start, bool all) {
+    HWY_ALIGN std::uint32_t lanes[HWY_MAX_BYTES / sizeof(std::uint32_t)];
+    hn::Store(pixel, Pixels(), lanes);
+    for (std::size_t i = 0; i < hn::Lanes(Pixels()); ++i) {
+        start = all ? start & lanes[i] : start | lanes[i];
+    }
+    return start;
+}
+
+void bgra_to_ycc(const std::uint32_t* from, const YccTarget& to, std::size_t pixels,
+                 CommonBits& bits) {
+    const std::size_t step = hn::Lanes(Pixels());
+    Pixel all = hn::Set(Pixels(), bits.all);
+    Pixel any = hn::Set(Pixels(), bits.any);
+    std::size_t done = 0;
+    for (; done + 4 * step <= pixels; done += 4 * step) {
+        Pixel four[4];
+        for (std::size_t i = 0; i < 4; ++i) {
+            four[i] = hn::LoadU(Pixels(), from + done + i * step);
+            all = hn::And(all, four[i]);
+            any = hn::Or(any, four[i]);
+        }
+        take_apart(four, behind(to, done));
+    }
+    bits.all = lanes_joined(all, bits.all, true);
+    bits.any = lanes_joined(any, bits.any, false);
+    scalar::bgra_to_ycc(from + done, behind(to, done), pixels - done, bits);
+}
+
 #endif
 
 }  // namespace zq::HWY_NAMESPACE
@@ -136,9 +246,15 @@ HWY_AFTER_NAMESPACE();
 namespace zq {
 
 HWY_EXPORT(ycc_to_bgra);
+HWY_EXPORT(bgra_to_ycc);
 
 void ycc_to_bgra(const YccRow& from, std::uint32_t* to, std::size_t pixels, Stores stores) {
     HWY_DYNAMIC_DISPATCH(ycc_to_bgra)(from, to, pixels, stores);
+}
+
+void bgra_to_ycc(const std::uint32_t* from, const YccTarget& to, std::size_t pixels,
+                 CommonBits& bits) {
+    HWY_DYNAMIC_DISPATCH(bgra_to_ycc)(from, to, pixels, bits);
 }
 
 }  // namespace zq

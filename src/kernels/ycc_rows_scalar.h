@@ -28,4 +28,24 @@ inline void ycc_to_bgra(const YccRow& from, std::uint32_t* to, std::size_t pixel
     }
 }
 
+// Weights in parts of 65536; of each sample's three they add up to 65536 or 0.
+inline void bgra_to_ycc(const std::uint32_t* from, const YccTarget& to, std::size_t pixels,
+                        CommonBits& bits) {
+    constexpr int kHalf = 32768;
+    constexpr int kMiddle = 128 << 16;
+    for (std::size_t i = 0; i < pixels; ++i) {
+        const std::uint32_t pixel = from[i];
+        const auto blue = static_cast<int>(pixel & 255), green = static_cast<int>(pixel >> 8 & 255),
+                   red = static_cast<int>(pixel >> 16 & 255);
+        const int y = 19595 * red + 38470 * green + 7471 * blue + kHalf;
+        const int cb = -11059 * red - 21709 * green + 32768 * blue + kMiddle + kHalf - 1;
+        const int cr = 32768 * red - 27439 * green - 5329 * blue + kMiddle + kHalf - 1;
+        to.y[i] = static_cast<std::uint8_t>(y >> 16);
+        to.cb[i] = static_cast<std::uint8_t>(cb >> 16);
+        to.cr[i] = static_cast<std::uint8_t>(cr >> 16);
+        bits.all &= pixel;
+        bits.any |= pixel;
+    }
+}
+
 }  // namespace zq::scalar

@@ -1,19 +1,15 @@
-// Rows go straight from the image to libjpeg, and those of U8 straight back, so that nothing is
-// copied.
+// One JPEG stream for each tile of an image.
 #include "serialize/quality_jpeg.h"
 
 #include <algorithm>
-#include <array>
 #include <cstring>
 #include <memory>
-#include <utility>
 
 #include "codecs/jpeg_memory.h"
 #include "codecs/jpeg_session.h"
 #include "convert/copy_rows.h"
-#include "kernels/alpha_rows.h"
 #include "kernels/stream_copy.h"
-#include "kernels/ycc_rows.h"
+#include "serialize/quality_bands.h"
 #include "serialize/quality_lossless.h"
 #include "serialize/quality_steps.h"
 
@@ -23,13 +19,6 @@ namespace {
 
 // JPEG ends at 65500; whole blocks of 8.
 constexpr std::int32_t kJpegSide = 65280;
-constexpr JDIMENSION kRowsAtOnce = 8;
-
-struct PixelTile {
-    std::uint8_t* first;
-    std::ptrdiff_t stride;  // bytes
-    std::int32_t x, y, width, height;
-};
 
 // Calls `visit` for each tile, row by row of tiles.
 template <class Visit>
@@ -55,9 +44,10 @@ bool is_alpha_constant(const CommonBits& bits) {
 
 void configure(jpeg_compress_struct& jpeg, bool colour, const JpegSteps& luma,
                const JpegSteps& chroma) {
-    jpeg.input_components = colour ? 4 : 1;
-    jpeg.in_color_space = colour ? JCS_EXT_BGRX : JCS_GRAYSCALE;
+    jpeg.input_components = colour ? 3 : 1;
+    jpeg.in_color_space = colour ? JCS_YCbCr : JCS_GRAYSCALE;
     jpeg_set_defaults(&jpeg);
+    jpeg.raw_data_in = TRUE;
     jpeg.dct_method = JDCT_ISLOW;
     jpeg.write_JFIF_header = FALSE;
     for (int i = 0; i < jpeg.num_components; ++i) {
@@ -68,24 +58,8 @@ void configure(jpeg_compress_struct& jpeg, bool colour, const JpegSteps& luma,
     if (colour) jpeg_add_quant_table(&jpeg, 1, chroma.data(), 100, TRUE);
 }
 
-// Alpha is looked at when libjpeg has brought the rows into the cache.
-void feed(jpeg_compress_struct& jpeg, const PixelTile& tile, CommonBits* bits) {
-    std::array<JSAMPROW, kRowsAtOnce> rows;
-    while (jpeg.next_scanline < jpeg.image_height) {
-        const JDIMENSION count = std::min(kRowsAtOnce, jpeg.image_height - jpeg.next_scanline);
-        for (JDIMENSION i = 0; i < count; ++i) {
-            rows[i] = tile.first + (jpeg.next_scanline + i) * tile.stride;
-        }
-        jpeg_write_scanlines(&jpeg, rows.data(), count);
-        for (JDIMENSION i = 0; bits != nullptr && i < count; ++i) {
-            gather_bits(reinterpret_cast<const std::uint32_t*>(rows[i]),
-                        static_cast<std::size_t>(tile.width), *bits);
-        }
-    }
-}
-
-void put_tile(Bytes& out, const PixelTile& tile, int quality, CommonBits* bits) {
-    const JpegSteps luma = bits != nullptr ? luma_steps(quality) : grey_steps(quality);
+void put_tile(Bytes& out, const PixelTile& tile, int quality, bool colour, EncoderBand& band) {
+    const JpegSteps luma = colour ? luma_steps(quality) : grey_steps(quality);
     const JpegSteps chroma = chroma_steps(quality);
     JpegSink sink(static_cast<std::size_t>(tile.width) * static_cast<std::size_t>(tile.height) / 4);
     JpegCompressor session;
@@ -94,9 +68,9 @@ void put_tile(Bytes& out, const PixelTile& tile, int quality, CommonBits* bits) 
     session.run(kSystemError, [&] {
         jpeg.image_width = static_cast<JDIMENSION>(tile.width);
         jpeg.image_height = static_cast<JDIMENSION>(tile.height);
-        configure(jpeg, bits != nullptr, luma, chroma);
+        configure(jpeg, colour, luma, chroma);
         jpeg_start_compress(&jpeg, TRUE);
-        feed(jpeg, tile, bits);
+        while (jpeg.next_scanline < jpeg.image_height) band.write(jpeg, tile);
         jpeg_finish_compress(&jpeg);
     });
     const OpenSection section(out);
@@ -142,60 +116,8 @@ void start(jpeg_decompress_struct& jpeg, const PixelTile& tile, bool colour) {
     jpeg_start_decompress(&jpeg);
 }
 
-// Eight rows of luminance and chrominance on their way from libjpeg to pixels with alpha. Cheaper
-// than to let libjpeg make pixels, as their alpha would take another pass over them.
-class YccBand {
-  public:
-    // For tiles of up to `width` pixels; `alpha` must outlive the band.
-    YccBand(const LosslessPlane& alpha, std::int32_t width, Stores stores)
-        : alpha_(alpha), stores_(stores), pitch_(pitch_for(static_cast<std::size_t>(width))) {
-        memory_ = std::make_unique_for_overwrite<std::uint8_t[]>((3 * kRowsAtOnce + 1) * pitch_);
-        std::uint8_t* row = memory_.get();
-        for (std::size_t plane = 0; plane < rows_.size(); ++plane) {
-            for (JSAMPROW& each : rows_[plane]) each = std::exchange(row, row + pitch_);
-            planes_[plane] = rows_[plane].data();
-        }
-        constant_alpha_ = row;
-        std::memset(row, alpha.value, pitch_);
-    }
-    YccBand(const YccBand&) = delete;
-    YccBand& operator=(const YccBand&) = delete;
-
-    // The tile's rows from the next on.
-    void read(jpeg_decompress_struct& jpeg, const PixelTile& tile) {
-        const JDIMENSION y = jpeg.output_scanline;
-        jpeg_read_raw_data(&jpeg, planes_.data(), kRowsAtOnce);
-        const JDIMENSION count = std::min(kRowsAtOnce, jpeg.output_height - y);
-        for (JDIMENSION i = 0; i < count; ++i) {
-            ycc_to_bgra({rows_[0][i], rows_[1][i], rows_[2][i], alpha_row(tile, y + i)},
-                        reinterpret_cast<std::uint32_t*>(tile.first + (y + i) * tile.stride),
-                        static_cast<std::size_t>(tile.width), stores_);
-        }
-    }
-
-  private:
-    // Whole blocks; an odd number of cache lines, so that rows do not drive each other out of it.
-    static std::size_t pitch_for(std::size_t width) {
-        constexpr std::size_t kLine = 64;
-        return (((width + kLine - 1) / kLine) | 1) * kLine;
-    }
-
-    const std::uint8_t* alpha_row(const PixelTile& tile, JDIMENSION y) const {
-        if (alpha_.planes == nullptr) return constant_alpha_;
-        return alpha_.planes->row(0, static_cast<std::size_t>(tile.y) + y) + tile.x;
-    }
-
-    const LosslessPlane& alpha_;
-    Stores stores_;
-    std::size_t pitch_;
-    std::unique_ptr<std::uint8_t[]> memory_;
-    const std::uint8_t* constant_alpha_;
-    std::array<std::array<JSAMPROW, kRowsAtOnce>, 3> rows_;
-    std::array<JSAMPARRAY, 3> planes_;
-};
-
 // `band` is null for U8, whose rows go straight to the tile.
-void read_tile(std::span<const std::uint8_t> bytes, const PixelTile& tile, YccBand* band) {
+void read_tile(std::span<const std::uint8_t> bytes, const PixelTile& tile, DecoderBand* band) {
     JpegSource source(bytes);
     JpegDecompressor session;
     jpeg_decompress_struct& jpeg = session.jpeg();
@@ -206,7 +128,7 @@ void read_tile(std::span<const std::uint8_t> bytes, const PixelTile& tile, YccBa
             if (band != nullptr) {
                 band->read(jpeg, tile);
             } else {
-                JSAMPROW row = tile.first + jpeg.output_scanline * tile.stride;
+                JSAMPROW row = tile.row(jpeg.output_scanline);
                 jpeg_read_scanlines(&jpeg, &row, 1);
             }
         }
@@ -214,7 +136,7 @@ void read_tile(std::span<const std::uint8_t> bytes, const PixelTile& tile, YccBa
 }
 
 void read_tiles(std::span<const std::span<const std::uint8_t>> streams, const Image& target,
-                YccBand* band) {
+                DecoderBand* band) {
     std::size_t next = 0;
     for_each_tile(target, [&](const PixelTile& tile) { read_tile(streams[next++], tile, band); });
 }
@@ -231,13 +153,12 @@ void copy_pixels(const Image& source, const Image& target) {
 
 void put_jpeg(Bytes& out, const Image& image, int quality) {
     const bool colour = image.type() == PixelType::kRgb;
-    CommonBits bits;
-    for_each_tile(image, [&](const PixelTile& tile) {
-        put_tile(out, tile, quality, colour ? &bits : nullptr);
-    });
+    EncoderBand band(colour, std::min(image.record().width, kJpegSide));
+    for_each_tile(image,
+                  [&](const PixelTile& tile) { put_tile(out, tile, quality, colour, band); });
     if (!colour) return;
-    if (is_alpha_constant(bits)) {
-        put_constant(out, static_cast<std::uint16_t>(bits.any >> 24));
+    if (is_alpha_constant(band.bits())) {
+        put_constant(out, static_cast<std::uint16_t>(band.bits().any >> 24));
     } else {
         put_alpha(out, image);
     }
@@ -250,14 +171,14 @@ void read_jpeg(StreamReader& reader, Image& image, PixelMemory memory) {
     std::vector<std::span<const std::uint8_t>> streams;
     for_each_tile(image, [&](const PixelTile&) { streams.push_back(reader.section()); });
     LosslessPlane plane;
-    std::unique_ptr<YccBand> band;
+    std::unique_ptr<DecoderBand> band;
     if (image.type() == PixelType::kRgb) {
         const auto width = static_cast<std::size_t>(record.width);
         const auto height = static_cast<std::size_t>(record.height);
         plane = read_lossless(reader, width, height, 1);
         const Stores stores =
             memory == PixelMemory::kFresh ? Stores::kCached : stores_for(4 * width * height);
-        band = std::make_unique<YccBand>(plane, std::min(record.width, kJpegSide), stores);
+        band = std::make_unique<DecoderBand>(plane, std::min(record.width, kJpegSide), stores);
     }
     reader.expect_end();
     if (is_one_tile(image)) {

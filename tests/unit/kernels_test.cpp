@@ -92,6 +92,53 @@ TEST(Kernels, YccRowsOfEveryLengthStayInside) {
     });
 }
 
+struct TakenApart {
+    std::vector<std::uint8_t> y, cb, cr;
+    CommonBits bits;
+
+    explicit TakenApart(std::size_t size) : y(size, kGuard), cb(size, kGuard), cr(size, kGuard) {}
+    YccTarget at(std::size_t start) { return {&y[start], &cb[start], &cr[start]}; }
+    void expect_same(const TakenApart& other) const {
+        ASSERT_EQ(y, other.y);
+        ASSERT_EQ(cb, other.cb);
+        ASSERT_EQ(cr, other.cr);
+        ASSERT_EQ(bits.all, other.bits.all);
+        ASSERT_EQ(bits.any, other.bits.any);
+    }
+};
+
+TEST(Kernels, EveryColourIsTakenApartAsByThePlainLoop) {
+    constexpr std::size_t kPixels = 256 * 256;
+    std::vector<std::uint32_t> pixels(kPixels);
+    for (std::uint32_t red = 0; red < 256; ++red) {
+        for (std::uint32_t i = 0; i < kPixels; ++i) pixels[i] = i | red << 16 | i * 7 << 24;
+        TakenApart expected(kPixels);
+        scalar::bgra_to_ycc(pixels.data(), expected.at(0), kPixels, expected.bits);
+        zqtest::on_every_simd_target([&] {
+            TakenApart actual(kPixels);
+            bgra_to_ycc(pixels.data(), actual.at(0), kPixels, actual.bits);
+            actual.expect_same(expected);
+        });
+    }
+}
+
+TEST(Kernels, PixelsOfRowsOfEveryLengthAreTakenApartInside) {
+    std::mt19937 random(6);
+    zqtest::on_every_simd_target([&] {
+        for (std::size_t count = 0; count <= 200; ++count) {
+            std::vector<std::uint32_t> pixels(count + 1);
+            // One pixel lacks a bit that all others have, or has one that none of them has.
+            for (auto& pixel : pixels) pixel = (random() & 0x7FFFFFFF) | 0x40000000;
+            if (count > 0) pixels[random() % count] ^= random() % 2 == 0 ? 0x80000000 : 0x40000000;
+            const std::size_t start = random() % 16 + 1;
+            TakenApart expected(count + 32), actual(count + 32);
+            scalar::bgra_to_ycc(pixels.data(), expected.at(start), count, expected.bits);
+            bgra_to_ycc(pixels.data(), actual.at(start), count, actual.bits);
+            actual.expect_same(expected);
+        }
+    });
+}
+
 TEST(Kernels, BitsOfRowsOfEveryLengthAndByte) {
     std::mt19937 random(4);
     zqtest::on_every_simd_target([&] {
