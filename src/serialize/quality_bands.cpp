@@ -14,9 +14,7 @@ std::size_t pitch_for(std::size_t width) {
     return (((width + kLine - 1) / kLine) | 1) * kLine;
 }
 
-using PlaneRows = std::array<std::array<JSAMPROW, DCTSIZE>, 3>;
-
-std::array<JSAMPARRAY, 3> plane_pointers(PlaneRows& rows) {
+std::array<JSAMPARRAY, 3> plane_pointers(BandRows& rows) {
     return {rows[0].data(), rows[1].data(), rows[2].data()};
 }
 
@@ -29,67 +27,80 @@ BandPlanes::BandPlanes(std::size_t planes, std::size_t width)
 EncoderBand::EncoderBand(bool colour, std::int32_t width)
     : colour_(colour), planes_(colour ? 3 : 1, static_cast<std::size_t>(width)) {}
 
-void EncoderBand::write(jpeg_compress_struct& jpeg, const PixelTile& tile) {
-    const JDIMENSION first = jpeg.next_scanline;
+BandRows& EncoderBand::load(const PixelTile& tile, JDIMENSION first) {
     for (std::size_t at = 0; at < DCTSIZE; ++at) {
-        const auto line = first + static_cast<JDIMENSION>(at);
-        if (line < jpeg.image_height) {
-            load(tile, line, at);
+        const JDIMENSION line = first + static_cast<JDIMENSION>(at);
+        if (line < static_cast<JDIMENSION>(tile.height)) {
+            load_line(tile.row(line), static_cast<std::size_t>(tile.width), at);
         } else {
             for (auto& plane : rows_) plane[at] = plane[at - 1];
         }
     }
-    auto pointers = plane_pointers(rows_);
+    return rows_;
+}
+
+void EncoderBand::write(jpeg_compress_struct& jpeg, const PixelTile& tile) {
+    auto pointers = plane_pointers(load(tile, jpeg.next_scanline));
     jpeg_write_raw_data(&jpeg, pointers.data(), DCTSIZE);
 }
 
-void EncoderBand::load(const PixelTile& tile, JDIMENSION line, std::size_t at) {
-    std::uint8_t* pixels = tile.row(line);
-    const auto width = static_cast<std::size_t>(tile.width);
+void EncoderBand::load_line(const std::uint8_t* pixels, std::size_t width, std::size_t at) {
     if (colour_) {
         const YccTarget target = {planes_.row(0, at), planes_.row(1, at), planes_.row(2, at)};
         bgra_to_ycc(reinterpret_cast<const std::uint32_t*>(pixels), target, width, bits_);
-        for (std::size_t plane = 0; plane < 3; ++plane) {
-            rows_[plane][at] = whole_blocks(plane, at, tile.width);
+        for (std::size_t plane = 0; plane < rows_.size(); ++plane) {
+            rows_[plane][at] = whole_blocks(plane, at, width);
         }
     } else if (width % DCTSIZE == 0) {
-        rows_[0][at] = pixels;
+        rows_[0][at] = const_cast<JSAMPROW>(pixels);  // libjpeg only reads
     } else {
         std::memcpy(planes_.row(0, at), pixels, width);
-        rows_[0][at] = whole_blocks(0, at, tile.width);
+        rows_[0][at] = whole_blocks(0, at, width);
     }
 }
 
-JSAMPROW EncoderBand::whole_blocks(std::size_t plane, std::size_t at, std::int32_t width) const {
+JSAMPROW EncoderBand::whole_blocks(std::size_t plane, std::size_t at, std::size_t width) const {
     std::uint8_t* row = planes_.row(plane, at);
-    const auto used = static_cast<std::size_t>(width);
-    std::memset(row + used, row[used - 1], (0 - used) % DCTSIZE);
+    std::memset(row + width, row[width - 1], (0 - width) % DCTSIZE);
     return row;
 }
 
-DecoderBand::DecoderBand(const LosslessPlane& alpha, std::int32_t width, Stores stores)
-    : alpha_(alpha), stores_(stores), planes_(3, static_cast<std::size_t>(width)) {
-    for (std::size_t plane = 0; plane < rows_.size(); ++plane) {
+DecoderBand::DecoderBand(bool colour, const LosslessPlane& alpha, std::int32_t width, Stores stores)
+    : colour_(colour),
+      alpha_(alpha),
+      stores_(stores),
+      planes_(colour ? 3 : 1, static_cast<std::size_t>(width)) {
+    for (std::size_t plane = 0; plane < (colour ? rows_.size() : 1); ++plane) {
         for (std::size_t line = 0; line < DCTSIZE; ++line) {
             rows_[plane][line] = planes_.row(plane, line);
         }
     }
-    if (alpha.planes != nullptr) return;
+    if (!colour || alpha.planes != nullptr) return;
     constant_alpha_ =
         std::make_unique_for_overwrite<std::uint8_t[]>(static_cast<std::size_t>(width));
     std::fill_n(constant_alpha_.get(), width, static_cast<std::uint8_t>(alpha.value));
+}
+
+void DecoderBand::store(const PixelTile& tile, JDIMENSION first) const {
+    const auto width = static_cast<std::size_t>(tile.width);
+    const JDIMENSION count =
+        std::min<JDIMENSION>(DCTSIZE, static_cast<JDIMENSION>(tile.height) - first);
+    for (JDIMENSION i = 0; i < count; ++i) {
+        std::uint8_t* pixels = tile.row(first + i);
+        if (colour_) {
+            ycc_to_bgra({rows_[0][i], rows_[1][i], rows_[2][i], alpha_row(tile, first + i)},
+                        reinterpret_cast<std::uint32_t*>(pixels), width, stores_);
+        } else {
+            std::memcpy(pixels, rows_[0][i], width);
+        }
+    }
 }
 
 void DecoderBand::read(jpeg_decompress_struct& jpeg, const PixelTile& tile) {
     const JDIMENSION first = jpeg.output_scanline;
     auto pointers = plane_pointers(rows_);
     jpeg_read_raw_data(&jpeg, pointers.data(), DCTSIZE);
-    const JDIMENSION count = std::min<JDIMENSION>(DCTSIZE, jpeg.output_height - first);
-    for (JDIMENSION i = 0; i < count; ++i) {
-        ycc_to_bgra({rows_[0][i], rows_[1][i], rows_[2][i], alpha_row(tile, first + i)},
-                    reinterpret_cast<std::uint32_t*>(tile.row(first + i)),
-                    static_cast<std::size_t>(tile.width), stores_);
-    }
+    store(tile, first);
 }
 
 const std::uint8_t* DecoderBand::alpha_row(const PixelTile& tile, JDIMENSION line) const {

@@ -43,45 +43,54 @@ class BandPlanes {
     std::unique_ptr<std::uint8_t[]> memory_;
 };
 
+// Eight lines of each plane.
+using BandRows = std::array<std::array<JSAMPROW, DCTSIZE>, 3>;
+
 // From pixels, U8 or RGB. What blocks have beyond the tile repeats its last column and line.
 class EncoderBand {
   public:
     // For tiles of up to `width` pixels.
     EncoderBand(bool colour, std::int32_t width);
 
-    // The tile's lines from the next on.
+    // The tile's lines from `first` on. They may be the image's own, and are not to be written.
+    BandRows& load(const PixelTile& tile, JDIMENSION first);
+    // Those that libjpeg wants next.
     void write(jpeg_compress_struct& jpeg, const PixelTile& tile);
 
-    // Of all pixels written so far, if they have colours.
+    // Of all pixels so far, if they have colours.
     const CommonBits& bits() const { return bits_; }
 
   private:
-    void load(const PixelTile& tile, JDIMENSION line, std::size_t at);
-    JSAMPROW whole_blocks(std::size_t plane, std::size_t at, std::int32_t width) const;
+    void load_line(const std::uint8_t* pixels, std::size_t width, std::size_t at);
+    JSAMPROW whole_blocks(std::size_t plane, std::size_t at, std::size_t width) const;
 
     bool colour_;
     BandPlanes planes_;
     CommonBits bits_;
-    std::array<std::array<JSAMPROW, DCTSIZE>, 3> rows_{};
+    BandRows rows_{};
 };
 
-// To pixels with alpha.
+// To pixels, those of RGB with their alpha.
 class DecoderBand {
   public:
     // For tiles of up to `width` pixels; `alpha` must outlive the band.
-    DecoderBand(const LosslessPlane& alpha, std::int32_t width, Stores stores);
+    DecoderBand(bool colour, const LosslessPlane& alpha, std::int32_t width, Stores stores);
 
-    // The tile's lines from the next on.
+    BandRows& rows() { return rows_; }
+    // The rows become the tile's lines from `first` on.
+    void store(const PixelTile& tile, JDIMENSION first) const;
+    // Those that libjpeg has next.
     void read(jpeg_decompress_struct& jpeg, const PixelTile& tile);
 
   private:
     const std::uint8_t* alpha_row(const PixelTile& tile, JDIMENSION line) const;
 
+    bool colour_;
     const LosslessPlane& alpha_;
     Stores stores_;
     BandPlanes planes_;
     std::unique_ptr<std::uint8_t[]> constant_alpha_;
-    std::array<std::array<JSAMPROW, DCTSIZE>, 3> rows_;
+    BandRows rows_{};
 };
 
 }  // namespace zq

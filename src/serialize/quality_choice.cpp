@@ -4,12 +4,14 @@
 #include <algorithm>
 #include <limits>
 #include <memory>
+#include <optional>
 #include <string_view>
 #include <vector>
 
 #include "serialize/quality_blocks.h"
 #include "serialize/quality_errors.h"
 #include "serialize/quality_payload.h"
+#include "serialize/quality_round_trip.h"
 #include "serialize/quality_sample.h"
 #include "serialize/quality_seam.h"
 
@@ -55,11 +57,13 @@ class Trials {
           touches_(touches),
           measure_(error_measure_of(sample.picture().type())),
           result_(blank()),
-          best_result_(blank()) {}
+          best_result_(blank()) {
+        if (is_jpeg_type(sample.picture().type())) round_trip_.emplace(sample.picture());
+    }
 
     // The squared error that is left; the best quality so far is kept, of equal ones the first.
     double attempt(int quality) {
-        Bytes payload = made(quality);
+        std::optional<Bytes> payload = made(quality);
         const double total = left_after_touches();
         if (quality != touches_) least_of_others_ = std::min(least_of_others_, total);
         if (best_.quality == 0 || total < sample_.confidence() * best_total_) {
@@ -104,8 +108,12 @@ class Trials {
         return image;
     }
 
-    // The payload, which result_ is decoded from.
-    Bytes made(int quality) const {
+    // Makes result_; also the payload, where that takes one.
+    std::optional<Bytes> made(int quality) const {
+        if (round_trip_) {
+            round_trip_->decode(quality, *result_);
+            return std::nullopt;
+        }
         Bytes payload;
         put_payload(payload, sample_.picture(), quality, sample_.image());
         StreamReader reader(payload);
@@ -163,6 +171,7 @@ class Trials {
     const ErrorMeasure measure_;
     const bool is_touched_ =
         (sample_.is_exact() && !sample_.is_whole()) || pixels_of(sample_.picture()) <= kMostTouched;
+    std::optional<JpegRoundTrip> round_trip_;
     std::unique_ptr<Image> result_;
     std::unique_ptr<Image> best_result_;
     QualityChoice best_{};

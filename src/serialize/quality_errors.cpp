@@ -4,6 +4,7 @@
 #include <cmath>
 #include <cstring>
 
+#include "kernels/squared_error.h"
 #include "serialize/quality_seam.h"
 
 namespace zq {
@@ -52,6 +53,14 @@ void add_row(const std::uint8_t* row, const std::uint8_t* back, std::int32_t pix
     }
 }
 
+template <auto kKernel>
+void add_byte_row(const std::uint8_t* row, const std::uint8_t* back, std::int32_t pixels,
+                  Errors& errors) {
+    const SquaredError error = kKernel(row, back, static_cast<std::size_t>(pixels));
+    errors.total += static_cast<double>(error.total);
+    errors.pixels += error.pixels;
+}
+
 template <Distance kDistance, int kStep>
 constexpr ErrorMeasure measure_by() {
     return {kDistance, add_row<kDistance, kStep>};
@@ -62,7 +71,7 @@ constexpr ErrorMeasure measure_by() {
 ErrorMeasure error_measure_of(PixelType type) {
     switch (type) {
         case PixelType::kU8:
-            return measure_by<squared_distance<std::uint8_t, 1>, 1>();
+            return {squared_distance<std::uint8_t, 1>, add_byte_row<squared_error_u8>};
         case PixelType::kI16:
             return measure_by<squared_distance<std::int16_t, 1>, 2>();
         case PixelType::kSgl:
@@ -70,7 +79,7 @@ ErrorMeasure error_measure_of(PixelType type) {
         case PixelType::kComplex:
             return measure_by<squared_distance<float, 2>, 8>();
         case PixelType::kRgb:
-            return measure_by<squared_distance<std::uint8_t, 3>, 4>();
+            return {squared_distance<std::uint8_t, 3>, add_byte_row<squared_error_bgrx>};
         case PixelType::kHsl:
             return measure_by<squared_hsl_distance, 4>();
         default:

@@ -178,7 +178,8 @@ void read_jpeg(StreamReader& reader, Image& image, PixelMemory memory) {
         plane = read_lossless(reader, width, height, 1);
         const Stores stores =
             memory == PixelMemory::kFresh ? Stores::kCached : stores_for(4 * width * height);
-        band = std::make_unique<DecoderBand>(plane, std::min(record.width, kJpegSide), stores);
+        band =
+            std::make_unique<DecoderBand>(true, plane, std::min(record.width, kJpegSide), stores);
     }
     reader.expect_end();
     if (is_one_tile(image)) {

@@ -8,6 +8,7 @@
 #include "kernels/colour_rows.h"
 #include "kernels/colour_rows_scalar.h"
 #include "kernels/pack_bits.h"
+#include "kernels/squared_error.h"
 #include "kernels/stream_copy.h"
 #include "kernels/ycc_rows.h"
 #include "kernels/ycc_rows_scalar.h"
@@ -135,6 +136,46 @@ TEST(Kernels, PixelsOfRowsOfEveryLengthAreTakenApartInside) {
             scalar::bgra_to_ycc(pixels.data(), expected.at(start), count, expected.bits);
             bgra_to_ycc(pixels.data(), actual.at(start), count, actual.bits);
             actual.expect_same(expected);
+        }
+    });
+}
+
+TEST(Kernels, SquaredErrorsOfRowsOfEveryLength) {
+    struct Case {
+        std::size_t bytes, samples;  // of a pixel
+        SquaredError (*fast)(const std::uint8_t*, const std::uint8_t*, std::size_t);
+    };
+    const Case cases[] = {{1, 1, squared_error_u8}, {4, 3, squared_error_bgrx}};
+    std::mt19937 random(8);
+    zqtest::on_every_simd_target([&] {
+        for (const Case& c : cases) {
+            // The longest is more than 32 bits hold, where all samples are as far off as can be.
+            for (std::size_t n = 0; n <= 301; ++n) {
+                const std::size_t pixels = n == 301 ? 1100000 : n;
+                std::vector<std::uint8_t> a(pixels * c.bytes), b(pixels * c.bytes);
+                std::uint64_t total = 0;
+                std::size_t different = 0;
+                for (std::size_t i = 0; i < pixels; ++i) {
+                    const bool same = n < 301 && random() % 3 == 0;
+                    std::uint64_t squares = 0;
+                    for (std::size_t k = 0; k < c.bytes; ++k) {
+                        const std::size_t at = i * c.bytes + k;
+                        a[at] = n == 301 ? 255 : static_cast<std::uint8_t>(random());
+                        b[at] = same && k < c.samples ? a[at]
+                                : n == 301            ? 0
+                                                      : static_cast<std::uint8_t>(random());
+                        const std::int64_t difference = a[at] - b[at];
+                        if (k < c.samples) {
+                            squares += static_cast<std::uint64_t>(difference * difference);
+                        }
+                    }
+                    total += squares;
+                    different += squares != 0 ? 1 : 0;
+                }
+                const SquaredError error = c.fast(a.data(), b.data(), pixels);
+                ASSERT_EQ(error.total, total) << pixels << " pixels of " << c.bytes;
+                ASSERT_EQ(error.pixels, different) << pixels << " pixels of " << c.bytes;
+            }
         }
     });
 }

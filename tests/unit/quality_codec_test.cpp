@@ -12,11 +12,8 @@
 #include <vector>
 
 #include "base/byte_order.h"
-#include "codecs/jpeg_memory.h"
 #include "image/image.h"
 #include "serialize/quality_codec.h"
-#include "serialize/quality_jpeg.h"
-#include "serialize/quality_steps.h"
 #include "tests/support/thoroughness.h"
 
 namespace zq {
@@ -329,92 +326,6 @@ TEST(QualityCodecTest, HuesStayOnTheirSideOfTheSeam) {
             for (int x = 0; x < size.width; ++x) {
                 ASSERT_LT(std::abs(image->row(y)[4 * x + 2] - back->row(y)[4 * x + 2]), 40)
                     << x << ' ' << y;
-            }
-        }
-    }
-}
-
-// What libjpeg makes of the pixels when it is given them as they are.
-Bytes stream_of_libjpeg(const Image& image, int quality) {
-    const bool colour = image.type() == PixelType::kRgb;
-    const JpegSteps luma = colour ? luma_steps(quality) : grey_steps(quality);
-    const JpegSteps chroma = chroma_steps(quality);
-    JpegSink sink(100000);
-    JpegCompressor session;
-    jpeg_compress_struct& jpeg = session.jpeg();
-    sink.attach(jpeg);
-    session.run(kSystemError, [&] {
-        jpeg.image_width = static_cast<JDIMENSION>(image.record().width);
-        jpeg.image_height = static_cast<JDIMENSION>(image.record().height);
-        jpeg.input_components = colour ? 4 : 1;
-        jpeg.in_color_space = colour ? JCS_EXT_BGRX : JCS_GRAYSCALE;
-        jpeg_set_defaults(&jpeg);
-        jpeg.write_JFIF_header = FALSE;
-        jpeg.comp_info[0].h_samp_factor = jpeg.comp_info[0].v_samp_factor = 1;
-        jpeg_add_quant_table(&jpeg, 0, luma.data(), 100, TRUE);
-        if (colour) jpeg_add_quant_table(&jpeg, 1, chroma.data(), 100, TRUE);
-        jpeg_start_compress(&jpeg, TRUE);
-        while (jpeg.next_scanline < jpeg.image_height) {
-            JSAMPROW row = image.row(static_cast<std::int32_t>(jpeg.next_scanline));
-            jpeg_write_scanlines(&jpeg, &row, 1);
-        }
-        jpeg_finish_compress(&jpeg);
-    });
-    const auto bytes = sink.bytes();
-    return {bytes.begin(), bytes.end()};
-}
-
-// The codec gives libjpeg planes of whole blocks, and completes those that the edges cut.
-TEST(QualityCodecTest, StreamsAreThoseOfLibjpeg) {
-    constexpr struct {
-        std::int32_t width, height;
-    } kSizes[] = {{1, 1}, {8, 8}, {7, 9}, {9, 7}, {64, 20}, {83, 21}, {131, 8}, {5, 33}};
-    for (const int type : {ZQ_TYPE_U8, ZQ_TYPE_RGB}) {
-        for (const auto& size : kSizes) {
-            const auto image = make({type, size.width, size.height, 2});
-            paint(*image, noise);
-            Bytes payload;
-            put_jpeg(payload, *image, 60);
-            StreamReader reader(payload);
-            const auto stream = reader.section();
-            EXPECT_TRUE(std::ranges::equal(stream, stream_of_libjpeg(*image, 60)))
-                << type << ": " << size.width << " x " << size.height;
-        }
-    }
-}
-
-// Colours are made by the codec itself, out of libjpeg's planes.
-TEST(QualityCodecTest, ColoursAreThoseOfLibjpeg) {
-    constexpr std::int32_t kWidth = 83, kHeight = 21;
-    const auto image = make({ZQ_TYPE_RGB, kWidth, kHeight, 0});
-    paint(*image, noise);
-    Bytes payload;
-    put_jpeg(payload, *image, 600);
-    constexpr std::uint8_t kStart[] = {0xFF, 0xD8, 0xFF};
-    const auto start = std::search(payload.begin(), payload.end(), kStart, kStart + 3);
-    JpegSource source({start, payload.end()});
-    JpegDecompressor session;
-    jpeg_decompress_struct& jpeg = session.jpeg();
-    source.attach(jpeg);
-    const auto expected = blank_like(*image);
-    session.run(kSystemError, [&] {
-        jpeg_read_header(&jpeg, TRUE);
-        jpeg.jpeg_color_space = JCS_YCbCr;
-        jpeg.out_color_space = JCS_EXT_BGRX;
-        jpeg_start_decompress(&jpeg);
-        while (jpeg.output_scanline < jpeg.output_height) {
-            JSAMPROW row = expected->row(static_cast<std::int32_t>(jpeg.output_scanline));
-            jpeg_read_scanlines(&jpeg, &row, 1);
-        }
-    });
-    const auto back = blank_like(*image);
-    StreamReader reader(payload);
-    read_jpeg(reader, *back, PixelMemory::kUsed);
-    for (std::int32_t y = 0; y < kHeight; ++y) {
-        for (std::int32_t x = 0; x < kWidth; ++x) {
-            for (int i = 0; i < 3; ++i) {
-                ASSERT_EQ(get(*back, x, y, i), get(*expected, x, y, i))
-                    << x << ' ' << y << ' ' << i;
             }
         }
     }
