@@ -2,11 +2,11 @@
 #include "serialize/quality_blocks.h"
 
 #include <algorithm>
-#include <array>
 #include <bit>
 #include <cstring>
 #include <iterator>
 #include <unordered_map>
+#include <utility>
 
 namespace zq {
 
@@ -15,13 +15,9 @@ namespace {
 // As many as an image of 2^20 pixels has.
 constexpr std::int64_t kMostBlocks = std::int64_t{1} << 14;
 
-// While there are few, so many that are equal are taken, for touches to have pixels to differ by.
+// For touches to have pixels to differ by.
 constexpr std::size_t kFewBlocks = 512;
-constexpr int kMostEquals = 16;
-struct Equals {
-    std::size_t last = 0;  // of those taken
-    int taken = 0;
-};
+constexpr std::size_t kMostOthers = 255;
 
 // Two pixels without their alpha, which is no part of a block.
 constexpr std::uint64_t kColours = 0x00FFFFFF00FFFFFF;
@@ -35,9 +31,13 @@ class BlockGrid {
     JpegBlock operator[](std::int64_t index) const {
         const std::int64_t x = index % across_ * kBlockSide;
         const std::int64_t y = index / across_ * kBlockSide;
-        return {static_cast<std::int32_t>(x), static_cast<std::int32_t>(y),
+        return {static_cast<std::int32_t>(x),
+                static_cast<std::int32_t>(y),
                 static_cast<std::int32_t>(std::min(kBlockSide, width_ - x)),
-                static_cast<std::int32_t>(std::min(kBlockSide, height_ - y)), 1};
+                static_cast<std::int32_t>(std::min(kBlockSide, height_ - y)),
+                static_cast<std::uint64_t>(y * width_ + x),
+                1,
+                {}};
     }
 
   private:
@@ -72,42 +72,35 @@ std::vector<JpegBlock> different_blocks(const Image& image) {
     const BlockGrid grid(image);
     const std::int64_t most = std::min(kMostBlocks, grid.size() / 2);
     std::vector<JpegBlock> blocks;
-    std::unordered_map<std::uint64_t, Equals> known;
+    std::unordered_map<std::uint64_t, std::size_t> known;
     for (std::int64_t i = 0; i < grid.size(); ++i) {
-        const JpegBlock block = grid[i];
-        Equals& equals = known[hash_of(image, block)];
-        if (std::ssize(known) > most) return {};
-        if (equals.taken == 0 || (equals.taken < kMostEquals && blocks.size() < kFewBlocks)) {
-            ++equals.taken;
-            equals.last = blocks.size();
-            blocks.push_back(block);
-        } else {
-            ++blocks[equals.last].count;
+        JpegBlock block = grid[i];
+        const auto [at, is_new] = known.try_emplace(hash_of(image, block), blocks.size());
+        if (is_new) {
+            if (std::ssize(known) > most) return {};
+            blocks.push_back(std::move(block));
+            continue;
+        }
+        JpegBlock& equal = blocks[at->second];
+        ++equal.count;
+        if (at->second < kFewBlocks && equal.others.size() < kMostOthers) {
+            equal.others.push_back(block.index);
         }
     }
     return blocks;
 }
 
-std::vector<JpegBlock> spread_blocks(const Image& image, std::int64_t count) {
+std::vector<JpegBlock> spread_blocks(const Image& image, std::int64_t most) {
     const BlockGrid grid(image);
+    const std::int64_t count = std::min(most, grid.size() / 2);
     std::vector<JpegBlock> blocks;
-    for (std::int64_t i = 0; i < count; ++i) blocks.push_back(grid[i * grid.size() / count]);
-    return blocks;
-}
-
-bool has_few_values(const Image& image) {
-    constexpr std::ptrdiff_t kFewValues = 32;
-    std::array<bool, 256> seen{};
-    const std::ptrdiff_t pixel = bytes_per_pixel(image.type());
-    const std::ptrdiff_t channels = std::min<std::ptrdiff_t>(pixel, 3);  // not alpha
-    for (std::int32_t y = 0; y < image.record().height; ++y) {
-        const std::uint8_t* at = image.row(y);
-        for (std::int32_t x = 0; x < image.record().width; ++x, at += pixel) {
-            for (std::ptrdiff_t i = 0; i < channels; ++i) seen[at[i]] = true;
-        }
-        if (std::ranges::count(seen, true) > kFewValues) return false;
+    for (std::int64_t i = 0; i < count; ++i) {
+        const std::int64_t from = i * grid.size() / count;
+        const std::int64_t stretch = (i + 1) * grid.size() / count - from;
+        const std::uint64_t scattered = mixed(0, static_cast<std::uint64_t>(i)) >> 1;
+        blocks.push_back(grid[from + static_cast<std::int64_t>(scattered) % stretch]);
     }
-    return true;
+    return blocks;
 }
 
 }  // namespace zq

@@ -104,11 +104,14 @@ QualitySample QualitySample::mosaic(const Image& image, std::span<const JpegBloc
     // What is left of the last row gets the last block, and counts for nothing.
     for (std::int32_t i = 0; i < rows * kBlockColumns; ++i) {
         const JpegBlock& block = blocks[static_cast<std::size_t>(std::min(i, count - 1))];
-        const Corner corner = {block.x, block.y};
-        const SamplePart part = {
-            i % kBlockColumns * kSide, i / kBlockColumns * kSide,       block.width, block.height,
-            corner.index_in(image),    static_cast<double>(block.count)};
-        copy(image, corner, *picture, part);
+        const SamplePart part = {i % kBlockColumns * kSide,
+                                 i / kBlockColumns * kSide,
+                                 block.width,
+                                 block.height,
+                                 block.index,
+                                 static_cast<double>(block.count),
+                                 block.others};
+        copy(image, {block.x, block.y}, *picture, part);
         complete_block(*picture, part);
         if (i < count) parts.push_back(part);
     }

@@ -19,8 +19,9 @@ inline std::int64_t pixels_of(const Image& image) {
 // A rectangle of the picture, and what it stands for.
 struct SamplePart {
     std::int32_t x, y, width, height;
-    std::uint64_t index;  // of its first pixel in the image: y * width + x
-    double count;         // how many times the image has it
+    std::uint64_t index;                     // of its first pixel in the image: y * width + x
+    double count;                            // how many times the image has it
+    std::vector<std::uint64_t> others = {};  // indexes of some that are equal
 };
 
 // Borrows the image.
@@ -33,8 +34,8 @@ class QualitySample {
     static QualitySample strips_of(const Image& image);
 
     // For JPEG, whose blocks come out the same wherever they stand: each different block of the
-    // image, a few times where there are few. Nothing where more than half of all or more than 2^14
-    // are different, as in photographs.
+    // image. Nothing where more than half of all or more than 2^14 are different, as in
+    // photographs.
     static std::optional<QualitySample> blocks_of(const Image& image);
 
     // For wavelets: four whole tiles from all over the image. Nothing where it has less.
