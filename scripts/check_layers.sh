@@ -1,6 +1,7 @@
 #!/usr/bin/env bash
 # Refuses an include that runs against the order of the layers under src/, an operating-system
-# header or switch outside platform/, and a path that exists on one machine only.
+# header or switch outside platform/, a path that exists on one machine only, and two types of one
+# name, whose inline functions the linker would take for the same.
 set -euo pipefail
 status=0
 report() { [[ -z $2 ]] || { printf '%s:\n%s\n' "$1" "$2"; status=1; }; }
@@ -28,4 +29,9 @@ report "operating-system switch outside platform/" \
 report "path of one machine" \
     "$(git grep --untracked -nIE '(^|[^A-Za-z0-9_.}/"]|(^|[^A-Za-z0-9_}])")/(work|root|tmp|home)/[A-Za-z]' -- \
         . ':!scripts/check_layers.sh' || true)"
+kType='^(struct|class|enum class) [A-Z][A-Za-z0-9]*( final)?( : [^;{]*)? \{'
+report "two types of one name" \
+    "$({ grep -rhoE "$kType" src --include='*.h' --exclude-dir=platform
+         grep -hoE "$kType" src/kernels/*.cpp; } |
+        sed -E 's/^(struct|class|enum class) ([A-Za-z0-9]+).*/\2/' | sort | uniq -d)"
 exit $status

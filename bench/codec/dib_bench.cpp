@@ -19,7 +19,7 @@ constexpr std::int32_t kHigh = 1080;
 constexpr std::size_t kArea = std::size_t{kWide} * kHigh;
 
 // Random bytes, samples of 12 bits or floats from 0 to 256; the same for every run.
-std::vector<std::uint32_t> noise(const zq::PixelView& view) {
+std::vector<std::uint32_t> noise(const zq::ShownPixels& view) {
     std::vector<std::uint32_t> words(kArea * view.pixel_bytes() / 4);
     std::uint32_t random = 1;
     for (std::uint32_t& word : words) {
@@ -33,7 +33,7 @@ std::vector<std::uint32_t> noise(const zq::PixelView& view) {
     return words;
 }
 
-void Bitmaps(benchmark::State& state, zq::PixelView view) {
+void Bitmaps(benchmark::State& state, zq::ShownPixels view) {
     const std::vector<std::uint32_t> pixels = noise(view);
     view.pixels = reinterpret_cast<const std::uint8_t*>(pixels.data());
     view.width = view.line_width = kWide;

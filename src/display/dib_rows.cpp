@@ -20,7 +20,7 @@ bool is_aligned(const void* address) {
 
 // A bitmap in the making: what of a view, and where.
 struct Sheet {
-    const PixelView& view;
+    const ShownPixels& view;
     const Dib& dib;
     const Part& part;
     std::uint8_t* bytes;
@@ -55,7 +55,7 @@ void fill_rows(const Sheet& sheet, const Row& row) {
 // In bands from the last one up, so that the first one, which is mapped next, is still in the
 // cache; but downwards within each, as the processor fetches ahead that way.
 template <class Sample, class Range>
-Range range_of(const PixelView& view) {
+Range range_of(const ShownPixels& view) {
     constexpr std::size_t kBandBytes = std::size_t{256} << 10;
     const std::size_t row_bytes = static_cast<std::size_t>(view.line_width) * sizeof(Sample);
     const auto band = static_cast<std::int32_t>(std::max<std::size_t>(1, kBandBytes / row_bytes));
@@ -70,15 +70,15 @@ Range range_of(const PixelView& view) {
 }
 
 void show_samples(const Sheet& sheet) {
-    const PixelView& view = sheet.view;
+    const ShownPixels& view = sheet.view;
     const bool full_range = view.right_shift == 0 && view.bit_depth == 0;
     Reduction reduction(view.bit_depth);
     if (view.right_shift > 0) {
         reduction.shift = view.right_shift;
         reduction.half = 0;
     }
-    SampleRange range;
-    if (full_range) range = range_of<std::int16_t, SampleRange>(view);
+    IntegerRange range;
+    if (full_range) range = range_of<std::int16_t, IntegerRange>(view);
     fill_rows(sheet, [&](const std::uint8_t* from, std::uint8_t* to, std::size_t pixels) {
         const auto* samples = reinterpret_cast<const std::int16_t*>(from);
         if (full_range) return i16_to_u8_in_range(samples, to, pixels, range);
@@ -98,7 +98,7 @@ void show_floats(const Sheet& sheet) {
 // Each row comes from where the exchange of the quadrants takes it; an odd last row or column
 // stays.
 void show_spectrum(const Sheet& sheet) {
-    const PixelView& view = sheet.view;
+    const ShownPixels& view = sheet.view;
     const double pixels = static_cast<double>(view.width) * view.height;
     const double scale = static_cast<float>(128.0 / pixels);
     const auto width = static_cast<std::size_t>(view.width);
@@ -117,7 +117,7 @@ void show_spectrum(const Sheet& sheet) {
 }
 
 void show(const Sheet& sheet) {
-    const PixelView& view = sheet.view;
+    const ShownPixels& view = sheet.view;
     switch (view.type) {
         case PixelType::kI16:
             return show_samples(sheet);
@@ -146,14 +146,14 @@ void show(const Sheet& sheet) {
 
 }  // namespace
 
-bool fits_in_place(const PixelView& view) {
+bool fits_in_place(const ShownPixels& view) {
     if (!is_aligned(view.pixels)) return false;
     if (view.type == PixelType::kU8) return view.width % 4 == 0 && view.line_width % 4 == 0;
     if (view.type != PixelType::kRgb) return false;
     return !view.packed_colour || (view.width % 4 == 0 && view.line_width % 4 == 0);
 }
 
-PixelView PixelView::of(const Image& image) {
+ShownPixels ShownPixels::of(const Image& image) {
     const ImageRecord& record = image.record();
     return {.pixels = record.firstPixel,
             .type = image.type(),
@@ -163,7 +163,7 @@ PixelView PixelView::of(const Image& image) {
             .bit_depth = image.bit_depth()};
 }
 
-Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch, const Part& part) {
+Dib make_dib(const ShownPixels& view, std::vector<std::uint8_t>& scratch, const Part& part) {
     const bool colour = view.type >= PixelType::kRgb;
     Dib dib{.width = view.width,
             .height = view.height,

@@ -10,7 +10,7 @@
 namespace zq {
 
 // Pixels to show; of an image or of a caller's buffer.
-struct PixelView {
+struct ShownPixels {
     const std::uint8_t* pixels = nullptr;
     PixelType type = PixelType::kU8;
     bool packed_colour = false;  // kRgb alone: 3 bytes a pixel
@@ -20,7 +20,7 @@ struct PixelView {
     std::int32_t right_shift = 0;  // kI16 alone: above 0 the bits to drop
     std::int32_t bit_depth = 0;
 
-    static PixelView of(const Image& image);
+    static ShownPixels of(const Image& image);
     Box bounds() const { return {0, 0, width, height}; }
     std::size_t pixel_bytes() const {
         return packed_colour ? 3 : static_cast<std::size_t>(bytes_per_pixel(type));
@@ -32,7 +32,7 @@ struct PixelView {
 };
 
 // Whether a bitmap can show the view's own pixels.
-bool fits_in_place(const PixelView& view);
+bool fits_in_place(const ShownPixels& view);
 
 // What a bitmap must hold of a view.
 struct Part {
@@ -43,6 +43,6 @@ struct Part {
 // The bitmap of a view, at least of a part of it, by the range of the whole view. `scratch` gets
 // the rows that cannot be shown in place, grows as it must, and must live as long as the bitmap;
 // beside the part it is left as it was. Throws kNotEnoughMemory.
-Dib make_dib(const PixelView& view, std::vector<std::uint8_t>& scratch, const Part& part);
+Dib make_dib(const ShownPixels& view, std::vector<std::uint8_t>& scratch, const Part& part);
 
 }  // namespace zq

@@ -22,7 +22,7 @@ Box inflate(const Box& box, std::int32_t x, std::int32_t y) {
     return {moved(box.left, -x), moved(box.top, -y), moved(box.right, x), moved(box.bottom, y)};
 }
 
-bool lies_inside(const Box& source, const PixelView& view) {
+bool lies_inside(const Box& source, const ShownPixels& view) {
     return source.left >= 0 && source.top >= 0 && source.right <= view.width &&
            source.bottom <= view.height && !source.empty();
 }
@@ -84,7 +84,7 @@ std::int64_t scaled(std::int32_t size, Extents extents) {
 
 }  // namespace
 
-PixelView view_for_flags(std::uint32_t flags) {
+ShownPixels view_for_flags(std::uint32_t flags) {
     switch (flags & ~kBottomUp) {
         case 0:
             return {.type = PixelType::kU8};
@@ -105,7 +105,7 @@ PixelView view_for_flags(std::uint32_t flags) {
     }
 }
 
-void draw(DeviceContext& dc, const PixelView& view, const Box& source_box,
+void draw(DeviceContext& dc, const ShownPixels& view, const Box& source_box,
           const Box& destination_box, const DrawOptions& options) {
     Box source = source_box;
     Box destination = destination_box;
@@ -140,8 +140,8 @@ void draw(DeviceContext& dc, const PixelView& view, const Box& source_box,
     }
 }
 
-void draw_zoomed(DeviceContext& dc, const std::optional<PixelView>& view, const ZoomedPlace& place,
-                 const DrawOptions& options) {
+void draw_zoomed(DeviceContext& dc, const std::optional<ShownPixels>& view,
+                 const ZoomedPlace& place, const DrawOptions& options) {
     if (!view) {
         dc.set_mapping({});
         paint_display_background(dc, place.client, std::nullopt);

@@ -10,7 +10,7 @@
 namespace zq {
 
 // The view that drawing flags name, still without size. Throws kBufferMode for unknown flags.
-PixelView view_for_flags(std::uint32_t flags);
+ShownPixels view_for_flags(std::uint32_t flags);
 inline constexpr std::uint32_t kBottomUp = 1;
 
 struct DrawOptions {
@@ -20,7 +20,7 @@ struct DrawOptions {
 
 // Draws a box of the view into a box of logical units. Nothing happens for an empty view or box or
 // one that leaves the view. Throws kNotEnoughMemory.
-void draw(DeviceContext& dc, const PixelView& view, const Box& source, const Box& destination,
+void draw(DeviceContext& dc, const ShownPixels& view, const Box& source, const Box& destination,
           const DrawOptions& options);
 
 struct ZoomedPlace {
@@ -31,7 +31,7 @@ struct ZoomedPlace {
 
 // Draws the whole view at an integer zoom, centred or scrolled, and the background around it; no
 // view: the background alone.
-void draw_zoomed(DeviceContext& dc, const std::optional<PixelView>& view, const ZoomedPlace& place,
-                 const DrawOptions& options);
+void draw_zoomed(DeviceContext& dc, const std::optional<ShownPixels>& view,
+                 const ZoomedPlace& place, const DrawOptions& options);
 
 }  // namespace zq

@@ -64,8 +64,8 @@ Box to_box(const ZqCoordinates& c) {
 }
 
 // Nothing for an empty rectangle and for one that no memory holds.
-std::optional<PixelView> buffer_view(PixelView view, const void* pixels, std::int64_t width,
-                                     std::int64_t height) {
+std::optional<ShownPixels> buffer_view(ShownPixels view, const void* pixels, std::int64_t width,
+                                       std::int64_t height) {
     constexpr std::int64_t kMost = 0x7FFFFFFF;
     if (width < 1 || height < 1 || width > kMost || height > kMost) return std::nullopt;
     const auto row_bytes = static_cast<std::uint64_t>(width) * view.pixel_bytes();
@@ -98,7 +98,7 @@ void draw_image(DeviceContext& dc, ImageHandle image, const ZoomedPlace& place,
     } catch (GRLIBError_enum) {
         return;
     }
-    PixelView view = PixelView::of(**locked);
+    ShownPixels view = ShownPixels::of(**locked);
     if (view.pixels == nullptr) view.width = view.height = 0;
     draw_zoomed(dc, view, place, options);
 }
@@ -111,10 +111,10 @@ struct Plot {
 
 void plot(DeviceContext& dc, const Plot& p) {
     if (p.pixels == nullptr) throw kBufferNullBuffer;
-    const PixelView format = view_for_flags(p.flags);
+    const ShownPixels format = view_for_flags(p.flags);
     const std::int64_t right = std::int64_t{p.left} + p.width;
     const std::int64_t bottom = std::int64_t{p.top} + p.height;
-    const std::optional<PixelView> view = buffer_view(format, p.pixels, right, bottom);
+    const std::optional<ShownPixels> view = buffer_view(format, p.pixels, right, bottom);
     const std::int64_t end_x = std::int64_t{p.x} + p.width;
     const std::int64_t end_y = std::int64_t{p.y} + p.height;
     if (!view || end_x > INT32_MAX || end_y > INT32_MAX || p.width < 1 || p.height < 1) return;
@@ -168,10 +168,11 @@ uint32_t ZQ_CALL Gen_PlotZoomedImage(ZqWindow window, const void* pixels, int32_
     return static_cast<uint32_t>(host::run_core([&] {
         const Target target = target_of(window, dc);
         DeviceContext& context = target.require();
-        std::optional<PixelView> view;
+        std::optional<ShownPixels> view;
         if (pixels != nullptr) {
             // Without pixels it is an image still: of 0 x 0.
-            view = buffer_view(view_for_flags(flags), pixels, width, height).value_or(PixelView{});
+            view =
+                buffer_view(view_for_flags(flags), pixels, width, height).value_or(ShownPixels{});
         }
         draw_silently([&] {
             draw_zoomed(context, view, place_in(window, zoom, {xOffset, yOffset}),

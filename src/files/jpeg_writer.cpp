@@ -1,4 +1,5 @@
-// Writing JPEG. libjpeg takes the rows as they lie in the image.
+// Writing JPEG. Where colours are subsampled or packed, libjpeg takes the rows as they lie in the
+// image; else it gets planes.
 #include "files/jpeg_writer.h"
 
 #include <algorithm>
@@ -25,6 +26,14 @@ int libjpeg_quality(std::int32_t quality) {
     return std::max((quality + 5) / 10, 1);
 }
 
+// Whether each colour is a word in memory; those of a caller's buffer may lie anywhere.
+bool are_words(const PixelView& pixels) {
+    constexpr std::size_t kWord = sizeof(std::uint32_t);
+    return pixels.packing != Packing::kPacked24 &&
+           reinterpret_cast<std::uintptr_t>(pixels.first) % kWord == 0 &&
+           static_cast<std::size_t>(pixels.stride) % kWord == 0;
+}
+
 std::uint16_t density_of(float step) {
     constexpr float kMost = 65535;
     if (!(step >= 1)) return 1;  // no number, too
@@ -46,7 +55,11 @@ void JpegWriter::check(const WriteJob& job) {
     }
 }
 
-JpegWriter::JpegWriter(OutputFile& file, const WriteJob& job) : sink_(file), job_(job) {}
+JpegWriter::JpegWriter(OutputFile& file, const WriteJob& job) : sink_(file), job_(job) {
+    const bool grey = job.pixels.type == PixelType::kU8;
+    const bool full_colour = quality_of(job.options) >= kFullColourQuality;
+    if (grey || (full_colour && are_words(job.pixels))) band_.emplace(!grey, job.pixels.width);
+}
 
 // The functions up to set_density are called inside a step.
 
@@ -60,6 +73,7 @@ void JpegWriter::configure() {
     jpeg().input_components = grey ? 1 : packed ? 3 : 4;
     jpeg().in_color_space = grey ? JCS_GRAYSCALE : packed ? JCS_EXT_BGR : JCS_EXT_BGRX;
     jpeg_set_defaults(&jpeg());
+    jpeg().raw_data_in = band_ ? TRUE : FALSE;
     jpeg_set_quality(&jpeg(), libjpeg_quality(quality), TRUE);
     if (!grey && quality >= kFullColourQuality) {
         jpeg().comp_info[0].h_samp_factor = 1;
@@ -84,7 +98,10 @@ void JpegWriter::write_info() {
 }
 
 void JpegWriter::write_rows() {
-    session_.run(kUnableToWriteData, [this] {
+    const PixelView& view = job_.pixels;
+    const JpegPixels pixels = {view.first, view.stride, view.width, view.height};
+    session_.run(kUnableToWriteData, [this, &pixels] {
+        while (band_ && jpeg().next_scanline < jpeg().image_height) band_->write(jpeg(), pixels);
         std::array<JSAMPROW, kRowsAtOnce> rows;
         while (jpeg().next_scanline < jpeg().image_height) {
             const JDIMENSION first = jpeg().next_scanline;

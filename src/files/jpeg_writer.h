@@ -1,7 +1,10 @@
 // Writes pixels as a JPEG stream through libjpeg.
 #pragma once
 
+#include <optional>
+
 #include "codecs/jpeg_session.h"
+#include "convert/jpeg_planes.h"
 #include "files/jpeg_streams.h"
 #include "files/output_file.h"
 #include "files/write_job.h"
@@ -30,6 +33,7 @@ class JpegWriter {
     JpegFileSink sink_;
     const WriteJob& job_;
     JpegCompressor session_;
+    std::optional<EncoderBand> band_;  // where the planes have the pixels' full resolution
 };
 
 }  // namespace zq

@@ -26,7 +26,7 @@ void write_bytes(png_structp png, png_bytep bytes, std::size_t count) {
 void flush_nothing(png_structp) {}
 
 std::int32_t lowest_of(const PixelView& pixels) {
-    SampleRange range;
+    IntegerRange range;
     for (std::int32_t y = 0; y < pixels.height; ++y) {
         widen_range(reinterpret_cast<const std::int16_t*>(pixels.row(y)),
                     static_cast<std::size_t>(pixels.width), 1, 0, range);

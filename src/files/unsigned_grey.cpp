@@ -10,7 +10,7 @@ namespace zq {
 
 // As a pixel, which is signed, such a sample is negative.
 bool any_above_signed(const std::uint8_t* row, std::size_t bytes) {
-    SampleRange range;
+    IntegerRange range;
     widen_range(reinterpret_cast<const std::int16_t*>(row), bytes / 2, 1, 0, range);
     return range.least < 0;
 }

@@ -27,7 +27,8 @@ class BlockSteps {
 
   private:
     std::array<std::int32_t, kBlockValues> steps_;
-    // round(c / s) = floor(c * reciprocal + bias) for c = 0, 1, ... 2^17, in eighths of s.
+    // Coefficients are eight times as large as steps: round(c / (8 s)) = floor(c * reciprocal +
+    // bias) for c = 0, 1, ... 2^15.
     std::array<float, kBlockValues> reciprocals_, biases_;
 };
 

@@ -81,7 +81,7 @@ HWY_INLINE void widen_any(const T* first, std::size_t pixels, std::size_t rows,
 }
 
 void widen_samples(const std::int16_t* first, std::size_t pixels, std::size_t rows,
-                   std::ptrdiff_t stride, SampleRange& range) {
+                   std::ptrdiff_t stride, IntegerRange& range) {
     widen_any(first, pixels, rows, stride, range);
 }
 
@@ -140,7 +140,7 @@ HWY_INLINE void map_any_range(const std::int16_t* from, std::uint8_t* to, std::s
 }
 
 void i16_to_u8_in_range(const std::int16_t* from, std::uint8_t* to, std::size_t pixels,
-                        SampleRange range) {
+                        IntegerRange range) {
     const std::int32_t span = std::max(1, range.largest - range.least);
 #if HWY_NATIVE_FMA
     if (span <= kShortSpan) return map_short_range(from, to, pixels, range.least, span);
@@ -233,7 +233,7 @@ HWY_EXPORT(make_scale);
 HWY_EXPORT(f32_to_u8_scaled);
 
 void widen_range(const std::int16_t* first, std::size_t pixels, std::size_t rows,
-                 std::ptrdiff_t stride, SampleRange& range) {
+                 std::ptrdiff_t stride, IntegerRange& range) {
     HWY_DYNAMIC_DISPATCH(widen_samples)(first, pixels, rows, stride, range);
 }
 
@@ -243,7 +243,7 @@ void widen_range(const float* first, std::size_t pixels, std::size_t rows, std::
 }
 
 void i16_to_u8_in_range(const std::int16_t* from, std::uint8_t* to, std::size_t pixels,
-                        SampleRange range) {
+                        IntegerRange range) {
     HWY_DYNAMIC_DISPATCH(i16_to_u8_in_range)(from, to, pixels, range);
 }
 

@@ -9,7 +9,7 @@
 
 namespace zq {
 
-struct SampleRange {
+struct IntegerRange {
     std::int32_t least = std::numeric_limits<std::int16_t>::max();
     std::int32_t largest = std::numeric_limits<std::int16_t>::min();
 };
@@ -22,14 +22,14 @@ struct FloatRange {
 
 // Widens a range by rows of so many pixels, `stride` apart. NaN takes no part.
 void widen_range(const std::int16_t* first, std::size_t pixels, std::size_t rows,
-                 std::ptrdiff_t stride, SampleRange& range);
+                 std::ptrdiff_t stride, IntegerRange& range);
 void widen_range(const float* first, std::size_t pixels, std::size_t rows, std::ptrdiff_t stride,
                  FloatRange& range);
 
 // (sample - least) * 255 / (largest - least) of samples within the range, rounded down; 0 for a
 // range of one value.
 void i16_to_u8_in_range(const std::int16_t* from, std::uint8_t* to, std::size_t pixels,
-                        SampleRange range);
+                        IntegerRange range);
 
 // How a picture's values become bytes.
 struct FloatScale {

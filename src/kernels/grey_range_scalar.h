@@ -17,7 +17,7 @@ void widen_range(const Sample* first, std::size_t pixels, std::size_t rows, std:
     }
 }
 
-inline std::uint8_t in_range(std::int16_t sample, SampleRange range) {
+inline std::uint8_t in_range(std::int16_t sample, IntegerRange range) {
     const std::int32_t span = range.largest - range.least;
     return span < 1 ? std::uint8_t{0}
                     : static_cast<std::uint8_t>((sample - range.least) * 255 / span);

@@ -141,11 +141,11 @@ using Sum = hn::Vec<Sums>;
 using Bytes = hn::Repartition<std::uint8_t, Words>;
 
 // Blue and red of a pixel, and green and alpha, as 16-bit samples.
-struct Pairs {
+struct ColourPairs {
     Word blue_red, green_alpha;
 };
 
-HWY_INLINE Pairs pairs_of(Pixel pixel) {
+HWY_INLINE ColourPairs pairs_of(Pixel pixel) {
     const auto words = hn::BitCast(UnsignedWords(), pixel);
     return {hn::BitCast(Words(), hn::And(words, hn::Set(UnsignedWords(), 0xFF))),
             hn::BitCast(Words(), hn::ShiftRight<8>(words))};
@@ -162,7 +162,7 @@ constexpr int kHalf = 32768;
 constexpr int kMiddle = (128 << 16) + kHalf - 1;
 
 // Sums in parts of 65536. Green counts twice by half of its weight, which would exceed 16 bits.
-HWY_INLINE Sum luminance(const Pairs& pixel) {
+HWY_INLINE Sum luminance(const ColourPairs& pixel) {
     const Word half_green = weights(19235, 0);
     Sum rest = hn::Zero(Sums());
     Sum sum = hn::Set(Sums(), kHalf);
@@ -173,7 +173,7 @@ HWY_INLINE Sum luminance(const Pairs& pixel) {
 }
 
 // With all weights of the other sign, as -32768 fits into 16 bits and 32768 does not.
-HWY_INLINE Sum chrominance(const Pairs& pixel, Word blue_red, Word green_alpha) {
+HWY_INLINE Sum chrominance(const ColourPairs& pixel, Word blue_red, Word green_alpha) {
     Sum rest = hn::Zero(Sums());
     Sum sum = hn::Zero(Sums());
     sum = hn::ReorderWidenMulAccumulate(Sums(), pixel.blue_red, blue_red, sum, rest);
@@ -183,9 +183,9 @@ HWY_INLINE Sum chrominance(const Pairs& pixel, Word blue_red, Word green_alpha) 
 
 // Bits 16 to 23 of four vectors.
 template <class Function>
-HWY_INLINE void store_whole_part(const Pairs (&pixels)[4], std::uint8_t* to,
+HWY_INLINE void store_whole_part(const ColourPairs (&pixels)[4], std::uint8_t* to,
                                  const Function& function) {
-    const auto upper_words = [&](const Pairs& low, const Pairs& high) HWY_ATTR {
+    const auto upper_words = [&](const ColourPairs& low, const ColourPairs& high) HWY_ATTR {
         return hn::ConcatOdd(Words(), hn::BitCast(Words(), function(high)),
                              hn::BitCast(Words(), function(low)));
     };
@@ -197,13 +197,14 @@ HWY_INLINE void store_whole_part(const Pairs (&pixels)[4], std::uint8_t* to,
 
 // Four vectors of pixels make one of bytes for each plane.
 HWY_INLINE void take_apart(const Pixel (&pixels)[4], const YccTarget& to) {
-    const Pairs pairs[] = {pairs_of(pixels[0]), pairs_of(pixels[1]), pairs_of(pixels[2]),
-                           pairs_of(pixels[3])};
-    store_whole_part(pairs, to.y, [](const Pairs& pixel) HWY_ATTR { return luminance(pixel); });
-    store_whole_part(pairs, to.cb, [](const Pairs& pixel) HWY_ATTR {
+    const ColourPairs pairs[] = {pairs_of(pixels[0]), pairs_of(pixels[1]), pairs_of(pixels[2]),
+                                 pairs_of(pixels[3])};
+    store_whole_part(pairs, to.y,
+                     [](const ColourPairs& pixel) HWY_ATTR { return luminance(pixel); });
+    store_whole_part(pairs, to.cb, [](const ColourPairs& pixel) HWY_ATTR {
         return chrominance(pixel, weights(-32768, 11059), weights(21709, 0));
     });
-    store_whole_part(pairs, to.cr, [](const Pairs& pixel) HWY_ATTR {
+    store_whole_part(pairs, to.cr, [](const ColourPairs& pixel) HWY_ATTR {
         return chrominance(pixel, weights(5329, -32768), weights(27439, 0));
     });
 }

@@ -3,6 +3,7 @@
 
 #include <limits>
 #include <span>
+#include <utility>
 
 #include "serialize/quality_blocks.h"
 #include "serialize/quality_payload.h"
@@ -36,6 +37,8 @@ constexpr Evenness kWavelets = {1.015, 1.12, 1.1, 8, 4};
 constexpr double kSurelyWorse = 1.5;
 // The mean squared error up to which rounding to whole samples has its part in it.
 constexpr double kRounding = 2;
+// Where fewer pixels of a sample are off, touches have too little to choose from.
+constexpr std::size_t kFewPixels = 1024;
 // A quality is the truest if all others have that many times its error in a lattice.
 constexpr double kClearOfLattice = 1.02;
 
@@ -77,14 +80,12 @@ bool repeats_itself(const Image& picture) {
     return !different_blocks(picture).empty();
 }
 
-// With the touches that the strips give.
-int truest_of(const Image& image, std::span<const int> qualities, int quality, Trials& strips) {
-    const QualitySample sample = QualitySample::whole_of(image);
-    Trials whole(sample, quality);
-    int best = quality;
+// Of the qualities that a sample leaves, with the touches that it gives.
+int truest_of(std::span<const int> qualities, Trials& whole, Trials& sample) {
+    int best = qualities.front();
     double least = std::numeric_limits<double>::infinity();
     for (const int candidate : qualities) {
-        const double left = whole.error(candidate) - strips.touched_error(candidate);
+        const double left = whole.error(candidate) - sample.touched_error(candidate);
         if (left < least) {
             least = left;
             best = candidate;
@@ -93,28 +94,40 @@ int truest_of(const Image& image, std::span<const int> qualities, int quality, T
     return best;
 }
 
+// Touches come from the same sample at every quality, so that they grow with it, unless too few
+// pixels are off there.
+QualityChoice choose_jpeg(const Image& image, int quality) {
+    const QualitySample lattice = QualitySample::lattice_of(image);
+    const QualitySample whole = QualitySample::whole_of(image);
+    Trials trials(lattice, quality);
+    search(trials, lattice, quality, kJpeg);
+    if (trials.best_left() == 0) return best_of(whole, quality);
+    const auto near = trials.near_best(kClearOfLattice);
+    if (near.size() == 1) {
+        QualityChoice choice = trials.take(near.front());
+        if (choice.errors.size() >= kFewPixels) return choice;
+    }
+    Trials of_whole(whole, quality);
+    const int best = truest_of(near, of_whole, trials);
+    QualityChoice choice = trials.take(best);
+    return choice.errors.size() >= kFewPixels ? std::move(choice) : of_whole.take(best);
+}
+
 double samples_of(const Image& image) {
     return static_cast<double>(pixels_of(image)) * (image.type() == PixelType::kU8 ? 1 : 3);
 }
 
-// Touches always come from the strips, so that they grow with the quality.
-QualityChoice choose_jpeg(const Image& image, const QualitySample& strips, int quality) {
-    const bool is_large = pixels_of(image) > kMostCompared;
-    Trials touched(strips, quality);
-    // There is no time for more where photographs are large.
-    if (is_large && search(touched, strips, quality, kLargeJpeg) &&
-        touched.best_left() > kRounding * samples_of(strips.picture())) {
-        return touched.take();
-    }
+// There is no time for more than the strips where photographs are large.
+QualityChoice choose_large_jpeg(const Image& image, const QualitySample& strips, int quality) {
+    Trials trials(strips, quality);
+    const bool is_even = search(trials, strips, quality, kLargeJpeg);
+    const bool is_rounded = trials.best_left() < kRounding * samples_of(strips.picture());
+    if (is_even && !is_rounded) return trials.take();
     const QualitySample lattice = QualitySample::lattice_of(image);
-    Trials trials(lattice, quality);
-    search(trials, lattice, quality, kJpeg);
-    // Where the samples are empty there is little in the image, but they do not tell what.
-    const bool is_blank = trials.best_left() == 0 || touched.error(quality) == 0;
-    if (is_large) return is_blank ? trials.take() : touched.take(trials.best_quality());
-    if (is_blank) return best_of(QualitySample::whole_of(image), quality);
-    const auto near = trials.near_best(kClearOfLattice);
-    return touched.take(near.size() == 1 ? near.front() : truest_of(image, near, quality, touched));
+    Trials more(lattice, quality);
+    search(more, lattice, quality, kJpeg);
+    QualityChoice choice = trials.take(more.best_quality());
+    return choice.errors.size() >= kFewPixels ? std::move(choice) : more.take();
 }
 
 QualityChoice choose_wavelets(const Image& image, int quality) {
@@ -137,7 +150,8 @@ QualityChoice choose_quality(const Image& image, int quality) {
     if (repeats_itself(strips.picture())) {
         if (const auto blocks = QualitySample::blocks_of(image)) return best_of(*blocks, quality);
     }
-    return choose_jpeg(image, strips, quality);
+    return pixels_of(image) <= kMostCompared ? choose_jpeg(image, quality)
+                                             : choose_large_jpeg(image, strips, quality);
 }
 
 }  // namespace zq

@@ -70,7 +70,7 @@ void put_tile(Bytes& out, const PixelTile& tile, int quality, bool colour, Encod
         jpeg.image_height = static_cast<JDIMENSION>(tile.height);
         configure(jpeg, colour, luma, chroma);
         jpeg_start_compress(&jpeg, TRUE);
-        while (jpeg.next_scanline < jpeg.image_height) band.write(jpeg, tile);
+        while (jpeg.next_scanline < jpeg.image_height) band.write(jpeg, tile.pixels());
         jpeg_finish_compress(&jpeg);
     });
     const OpenSection section(out);

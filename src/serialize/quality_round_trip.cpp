@@ -2,11 +2,12 @@
 #include "serialize/quality_round_trip.h"
 
 #include <algorithm>
-#include <array>
-#include <cstring>
 
+#include "convert/jpeg_planes.h"
 #include "kernels/dct_blocks.h"
+#include "kernels/stores.h"
 #include "serialize/quality_bands.h"
+#include "serialize/quality_lossless.h"
 #include "serialize/quality_steps.h"
 
 namespace zq {
@@ -41,7 +42,7 @@ JpegRoundTrip::JpegRoundTrip(const Image& picture)
     EncoderBand band(planes_ == 3, tile.width);
     std::int16_t* to = coefficients_.data();
     for (std::int32_t y = 0; y < tile.height; y += kBandLines) {
-        const auto& rows = band.load(tile, static_cast<JDIMENSION>(y));
+        const auto& rows = band.load(tile.pixels(), static_cast<JDIMENSION>(y));
         for (std::size_t plane = 0; plane < planes_; ++plane, to += blocks_ * kBlockValues) {
             forward_dct(lines_of<BlockLines>(rows[plane]), blocks_, to);
         }

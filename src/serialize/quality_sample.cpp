@@ -79,7 +79,9 @@ QualitySample QualitySample::strips_of(const Image& image) {
     const std::int32_t whole_blocks = record.height / kSide * kSide;
     const std::int32_t height =
         whole_blocks == 0 ? record.height : std::min(whole_blocks, shape.height);
-    const std::int32_t strips = height == shape.height ? shape.strips : 1;
+    // Strips must not overlap, or a pixel would be told twice.
+    const bool has_room = record.height - shape.height / shape.strips >= shape.strips * kSide;
+    const std::int32_t strips = has_room ? shape.strips : 1;
     const std::int32_t strip = height / strips;
     auto picture = blank(record.type, width, height);
     std::vector<SamplePart> parts;

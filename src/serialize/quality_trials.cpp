@@ -50,9 +50,7 @@ Trials::Trials(const QualitySample& sample, int touches)
       touches_(touches),
       measure_(error_measure_of(sample.picture().type())),
       is_touched_((sample.is_exact() && !sample.is_whole()) ||
-                  pixels_of(sample.picture()) <= kMostTouched),
-      result_(blank()),
-      best_result_(blank()) {
+                  pixels_of(sample.picture()) <= kMostTouched) {
     if (is_jpeg_type(sample.picture().type())) round_trip_.emplace(sample.picture());
 }
 
@@ -118,6 +116,7 @@ std::unique_ptr<Image> Trials::blank() const {
 
 // Makes result_; also the payload, where that takes one.
 std::optional<Bytes> Trials::make(int quality) {
+    if (result_ == nullptr) result_ = blank();
     if (round_trip_) {
         round_trip_->decode(quality, *result_);
         return std::nullopt;
@@ -133,14 +132,15 @@ Errors Trials::errors_in_result() const {
     Errors all;
     const auto parts = sample_.parts();
     for (std::size_t i = 0; i < parts.size();) {
-        SamplePart run = parts[i++];
-        while (i < parts.size() && continues(run, parts[i])) run.width += parts[i++].width;
+        const SamplePart& first = parts[i++];
+        std::int32_t width = first.width;
+        while (i < parts.size() && continues(parts[i - 1], parts[i])) width += parts[i++].width;
         Errors errors;
-        for (std::int32_t y = run.y; y < run.y + run.height; ++y) {
-            measure_.add_row(at(sample_.picture(), run.x, y), at(*result_, run.x, y), run.width,
+        for (std::int32_t y = first.y; y < first.y + first.height; ++y) {
+            measure_.add_row(at(sample_.picture(), first.x, y), at(*result_, first.x, y), width,
                              errors);
         }
-        all.total += run.count * errors.total;
+        all.total += first.count * errors.total;
         all.pixels += errors.pixels;
     }
     return all;

@@ -59,8 +59,8 @@ class Trials {
     const ErrorMeasure measure_;
     const bool is_touched_;  // the touches are chosen, not only their share
     std::optional<JpegRoundTrip> round_trip_;
-    std::unique_ptr<Image> result_;
-    std::unique_ptr<Image> best_result_;
+    std::unique_ptr<Image> result_;       // of the last one made
+    std::unique_ptr<Image> best_result_;  // of the best attempt
     std::vector<Attempt> attempts_;
     QualityChoice best_{};
     double best_left_ = 0;

@@ -42,7 +42,7 @@ class Recorder final : public DeviceContext {
     Mapping mapping_;
 };
 
-PixelView view_of(const void* pixels, PixelType type, std::int32_t width, std::int32_t height) {
+ShownPixels view_of(const void* pixels, PixelType type, std::int32_t width, std::int32_t height) {
     return {.pixels = static_cast<const std::uint8_t*>(pixels),
             .type = type,
             .width = width,
@@ -50,7 +50,7 @@ PixelView view_of(const void* pixels, PixelType type, std::int32_t width, std::i
             .line_width = width};
 }
 
-std::vector<int> shown(const PixelView& view) {
+std::vector<int> shown(const ShownPixels& view) {
     std::vector<std::uint8_t> scratch;
     const Dib dib = make_dib(view, scratch, {view.bounds(), {}});
     std::vector<int> bytes;
@@ -65,7 +65,7 @@ std::vector<int> shown(const PixelView& view) {
 
 TEST(Draw, OnlyWhatIsVisibleAtTheSamePlaceAndInTilesWithoutLargeBitmaps) {
     const std::vector<std::uint8_t> pixels(2000 * 1500);
-    const PixelView view = view_of(pixels.data(), PixelType::kU8, 2000, 1500);
+    const ShownPixels view = view_of(pixels.data(), PixelType::kU8, 2000, 1500);
     Recorder dc;
     dc.base = pixels.data();
     dc.clip = {5, 6, 105, 56};
@@ -116,7 +116,7 @@ TEST(Draw, PlacesZoomedImages) {
     for (const Case& c : cases) {
         Recorder dc;
         if (!c.background) dc.clip = {0, 0, c.width, c.width};
-        const PixelView view = view_of(pixels.data(), PixelType::kU8, c.width, c.width);
+        const ShownPixels view = view_of(pixels.data(), PixelType::kU8, c.width, c.width);
         draw_zoomed(dc, view, {c.zoom, {c.offset, c.offset}, {0, 0, c.client, c.client}}, {});
         const Mapping mapping = dc.mapping();
         EXPECT_EQ(mapping.viewport_extent, (Point{c.viewport, c.viewport})) << c.zoom;
@@ -131,7 +131,7 @@ TEST(Draw, PlacesZoomedImages) {
 TEST(Draw, ShowsEveryType) {
     constexpr float kNan = std::numeric_limits<float>::quiet_NaN();
     alignas(4) const std::int16_t samples[] = {-4, 3, 4, 1023, 1024, 32767};
-    PixelView grey = view_of(samples, PixelType::kI16, 6, 1);
+    ShownPixels grey = view_of(samples, PixelType::kI16, 6, 1);
     EXPECT_EQ(shown(grey), (std::vector<int>{0, 0, 0, 7, 7, 255})) << "smallest to largest";
     grey.right_shift = 2;
     EXPECT_EQ(shown(grey), (std::vector<int>{0, 0, 1, 255, 255, 255}));
@@ -160,7 +160,7 @@ TEST(Draw, ShowsEveryType) {
     EXPECT_EQ(std::vector<int>(middle.bits, middle.bits + 3), (std::vector<int>{1, 0, 5}));
 
     const std::uint16_t wide[] = {100, 300, 65535, 1};
-    PixelView wide_view = view_of(wide, PixelType::kRgbU64, 1, 1);
+    ShownPixels wide_view = view_of(wide, PixelType::kRgbU64, 1, 1);
     wide_view.bit_depth = 10;
     std::vector<int> colour = shown(wide_view);
     colour.resize(3);
@@ -186,7 +186,7 @@ TEST(Draw, TakesRowsInPlaceWhereTheyAreAligned) {
         {0, 5, PixelType::kRgb, false, true}, {2, 4, PixelType::kRgb, false, false},
     };
     for (const Case& c : cases) {
-        PixelView view = view_of(pixels + c.offset, c.type, c.width, 2);
+        ShownPixels view = view_of(pixels + c.offset, c.type, c.width, 2);
         view.packed_colour = c.packed;
         std::vector<std::uint8_t> scratch;
         EXPECT_EQ(make_dib(view, scratch, {view.bounds(), {}}).bits == view.pixels, c.in_place)

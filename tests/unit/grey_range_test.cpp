@@ -31,7 +31,7 @@ TEST(GreyRange, SamplesOfEveryValueAndRange) {
             for (std::int32_t v = least; v <= largest; ++v) {
                 all.push_back(static_cast<std::int16_t>(v));
             }
-            compare(all, SampleRange{least, largest}, i16_to_u8_in_range);
+            compare(all, IntegerRange{least, largest}, i16_to_u8_in_range);
         }
         // Every quotient that is just below a whole number, and the next one, for every length of a
         // range.
@@ -42,7 +42,7 @@ TEST(GreyRange, SamplesOfEveryValueAndRange) {
                 critical.push_back(static_cast<std::int16_t>(sample));
                 critical.push_back(static_cast<std::int16_t>(sample + 1));
             }
-            compare(critical, SampleRange{-32768, span - 32768}, i16_to_u8_in_range);
+            compare(critical, IntegerRange{-32768, span - 32768}, i16_to_u8_in_range);
         }
     });
 }
@@ -110,7 +110,7 @@ TEST(GreyRange, EndsOfRowsOfEveryLength) {
                             : std::bit_cast<float>(static_cast<std::uint32_t>(random()));
                 if (random() % 4 == 0) value = std::nanf("");
             }
-            compare_ranges<std::int16_t, SampleRange>(samples, pixels);
+            compare_ranges<std::int16_t, IntegerRange>(samples, pixels);
             compare_ranges<float, FloatRange>(floats, pixels);
         }
     });

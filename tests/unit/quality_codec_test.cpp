@@ -209,9 +209,9 @@ double chequers(int x, int y, int) {
     return (x / 5 + y / 5) % 2;
 }
 
-// Larger than what is always tried as a whole: soft parts that only some of the sampled strips
-// meet, and stripes, of which a sample does not tell the best quality. Larger still: chequers of
-// few different blocks, and text, where none is like another.
+// Larger than what is always tried as a whole: pictures whose samples leave several qualities, low
+// ones that have no room for strips, some of few different blocks, nearly exact ones, and text that
+// is too large to be compared.
 TEST(QualityCodecTest, SampledPicturesGetTruerToo) {
     constexpr struct {
         Picture picture;
