@@ -2,6 +2,7 @@
 #include "serialize/quality_choice.h"
 
 #include <limits>
+#include <optional>
 #include <span>
 #include <utility>
 
@@ -17,7 +18,7 @@ namespace {
 constexpr std::int64_t kMostWhole = std::int64_t{1} << 17;
 // Of images up to here JPEG compares the few qualities that a sample leaves.
 constexpr std::int64_t kMostCompared = std::int64_t{1} << 22;
-// Wavelets try the whole image where a sample does not tell.
+// Up to here wavelets find touches in the image itself, beyond in four tiles of it.
 constexpr std::int64_t kMostWholeWavelets = std::int64_t{1} << 21;
 
 // How far back lower qualities are tried: where the error grows as evenly as it does in
@@ -94,8 +95,9 @@ int truest_of(std::span<const int> qualities, Trials& whole, Trials& sample) {
     return best;
 }
 
-// Touches come from the same sample at every quality, so that they grow with it, unless too few
-// pixels are off there.
+// In all of these touches come from the same sample at every quality, so that they grow with it,
+// unless too few of its pixels are off.
+
 QualityChoice choose_jpeg(const Image& image, int quality) {
     const QualitySample lattice = QualitySample::lattice_of(image);
     const QualitySample whole = QualitySample::whole_of(image);
@@ -131,14 +133,20 @@ QualityChoice choose_large_jpeg(const Image& image, const QualitySample& strips,
 }
 
 QualityChoice choose_wavelets(const Image& image, int quality) {
-    const QualitySample sample = QualitySample::strips_of(image);
-    Trials trials(sample, quality);
-    if (search(trials, sample, quality, kWavelets) && trials.is_truest()) return trials.take();
-    if (pixels_of(image) <= kMostWholeWavelets) {
-        return best_of(QualitySample::whole_of(image), quality);
+    const QualitySample part = QualitySample::strips_of(image);
+    Trials trials(part, quality);
+    const bool is_clear = search(trials, part, quality, kWavelets) && trials.is_truest();
+    const auto larger = pixels_of(image) <= kMostWholeWavelets
+                            ? std::optional(QualitySample::whole_of(image))
+                            : QualitySample::tiles_of(image);
+    if (!larger) return trials.take();
+    Trials more(*larger, quality);
+    if (is_clear) {
+        more.attempt(quality);
+    } else {
+        search(more, *larger, quality, kWavelets);
     }
-    const auto tiles = QualitySample::tiles_of(image);
-    return tiles ? best_of(*tiles, quality) : trials.take();
+    return more.take();
 }
 
 }  // namespace
