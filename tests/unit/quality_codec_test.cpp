@@ -167,7 +167,9 @@ TEST(QualityCodecTest, EverySizeComesBack) {
             SCOPED_TRACE(testing::Message() << type << ": " << width << " x " << height);
             const auto image = make({type, width, height, 2});
             paint(*image, soft);
+            const bool is_long = width > 60000 || height > 60000;
             for (const int quality : {1, 75, 100}) {
+                if (!zqtest::kThorough && is_long && quality != 75) continue;
                 const auto back = round_trip(*image, quality);
                 if (width > 0) {
                     ASSERT_GT(psnr(*image, *back), quality == 100 ? 45 : 10);
@@ -183,7 +185,7 @@ struct Picture {
     std::int32_t width, height;
 };
 
-// At every single step (natively), until nothing is left to get truer.
+// At every single step (where tests are thorough), until nothing is left to get truer.
 TEST(QualityCodecTest, PicturesGetTruerWithEveryQuality) {
     constexpr Picture kPictures[] = {{"photograph", photograph, 120, 90}, {"soft", soft, 96, 60}};
     for (int type = 0; type < 7; ++type) {
@@ -191,7 +193,7 @@ TEST(QualityCodecTest, PicturesGetTruerWithEveryQuality) {
             const auto image = make({type, picture.width, picture.height, 0});
             paint(*image, picture.paint);
             double last = 0;
-            for (int quality = 1; quality <= 100; quality += zqtest::kThorough ? 1 : 9) {
+            for (int quality = 1; quality <= 100; quality += zqtest::kThorough ? 1 : 33) {
                 const double now = psnr(*image, *round_trip(*image, quality));
                 EXPECT_TRUE(now > last || now == kExact)
                     << type << ' ' << picture.name << ' ' << quality << ' ' << now << ' ' << last;
@@ -222,6 +224,7 @@ TEST(QualityCodecTest, SampledPicturesGetTruerToo) {
         {{"chequers", chequers, 1201, 901}, 65, 68}, {{"text", text, 1201, 901}, 65, 69},
         {{"text", text, 2201, 2003}, 67, 68}};
     for (const int type : {ZQ_TYPE_U8, ZQ_TYPE_RGB}) {
+        if (!zqtest::kThorough && type != ZQ_TYPE_U8) continue;
         for (const auto& c : kCases) {
             const auto image = make({type, c.picture.width, c.picture.height, 0});
             paint(*image, c.picture.paint);
@@ -245,7 +248,7 @@ TEST(QualityCodecTest, OtherPicturesDoNotGetWorse) {
             const auto image = make({type, picture.width, picture.height, 0});
             paint(*image, picture.paint);
             double last = 0;
-            for (int quality = 1; quality <= 100; quality += zqtest::kThorough ? 3 : 11) {
+            for (int quality = 1; quality <= 100; quality += zqtest::kThorough ? 3 : 33) {
                 const double now = psnr(*image, *round_trip(*image, quality));
                 ASSERT_GE(now, last) << type << ' ' << picture.name << ' ' << quality;
                 last = now;
