@@ -1,13 +1,16 @@
 // Which qualities are tried, and on what.
 #include "serialize/quality_choice.h"
 
+#include <algorithm>
 #include <limits>
 #include <optional>
 #include <span>
 #include <utility>
+#include <vector>
 
 #include "serialize/quality_blocks.h"
 #include "serialize/quality_payload.h"
+#include "serialize/quality_round_trip.h"
 #include "serialize/quality_sample.h"
 #include "serialize/quality_trials.h"
 
@@ -18,6 +21,7 @@ namespace {
 constexpr std::int64_t kMostWhole = std::int64_t{1} << 17;
 // Of images up to here JPEG compares the few qualities that a sample leaves.
 constexpr std::int64_t kMostCompared = std::int64_t{1} << 22;
+constexpr std::int64_t kMostComparedDrawn = std::int64_t{1} << 24;
 // Up to here wavelets find touches in the image itself, beyond in four tiles of it.
 constexpr std::int64_t kMostWholeWavelets = std::int64_t{1} << 21;
 
@@ -81,22 +85,24 @@ bool repeats_itself(const Image& picture) {
     return !different_blocks(picture).empty();
 }
 
-// Of the qualities that a sample leaves, with the touches that it gives.
-int truest_of(std::span<const int> qualities, Trials& whole, Trials& sample) {
+// In all of these touches come from the same sample at every quality, so that they grow with it,
+// unless too few of its pixels are off.
+
+// By the whole image, of the qualities that a sample leaves.
+int truest_of(const Image& image, std::span<const int> qualities, Trials& touches) {
+    if (qualities.size() == 1) return qualities.front();
+    const std::vector<double> errors = squared_errors(image, qualities);
     int best = qualities.front();
     double least = std::numeric_limits<double>::infinity();
-    for (const int candidate : qualities) {
-        const double left = whole.error(candidate) - sample.touched_error(candidate);
+    for (std::size_t i = 0; i < qualities.size(); ++i) {
+        const double left = errors[i] - touches.touched_error(qualities[i]);
         if (left < least) {
             least = left;
-            best = candidate;
+            best = qualities[i];
         }
     }
     return best;
 }
-
-// In all of these touches come from the same sample at every quality, so that they grow with it,
-// unless too few of its pixels are off.
 
 QualityChoice choose_jpeg(const Image& image, int quality) {
     const QualitySample lattice = QualitySample::lattice_of(image);
@@ -104,32 +110,36 @@ QualityChoice choose_jpeg(const Image& image, int quality) {
     Trials trials(lattice, quality);
     search(trials, lattice, quality, kJpeg);
     if (trials.best_left() == 0) return best_of(whole, quality);
-    const auto near = trials.near_best(kClearOfLattice);
-    if (near.size() == 1) {
-        QualityChoice choice = trials.take(near.front());
-        if (choice.errors.size() >= kFewPixels) return choice;
-    }
-    Trials of_whole(whole, quality);
-    const int best = truest_of(near, of_whole, trials);
+    const int best = truest_of(image, trials.near_best(kClearOfLattice), trials);
     QualityChoice choice = trials.take(best);
-    return choice.errors.size() >= kFewPixels ? std::move(choice) : of_whole.take(best);
+    return choice.errors.size() >= kFewPixels ? std::move(choice)
+                                              : Trials(whole, quality).take(best);
 }
 
 double samples_of(const Image& image) {
     return static_cast<double>(pixels_of(image)) * (image.type() == PixelType::kU8 ? 1 : 3);
 }
 
+// Large pictures go by fives up to 80, where a single step may tell so little that only the whole
+// picture would show it. In between touches alone make the difference.
+int told_of(int quality) {
+    return quality < 80 ? std::max(quality / 5 * 5, 1) : quality;
+}
+
 // There is no time for more than the strips where photographs are large.
 QualityChoice choose_large_jpeg(const Image& image, const QualitySample& strips, int quality) {
+    const int told = told_of(quality);
     Trials trials(strips, quality);
-    const bool is_even = search(trials, strips, quality, kLargeJpeg);
+    const bool is_even = search(trials, strips, told, kLargeJpeg);
     const bool is_rounded = trials.best_left() < kRounding * samples_of(strips.picture());
     if (is_even && !is_rounded) return trials.take();
     const QualitySample lattice = QualitySample::lattice_of(image);
     Trials more(lattice, quality);
-    search(more, lattice, quality, kJpeg);
-    QualityChoice choice = trials.take(more.best_quality());
-    return choice.errors.size() >= kFewPixels ? std::move(choice) : more.take();
+    search(more, lattice, told, kJpeg);
+    const double clear = pixels_of(image) <= kMostComparedDrawn ? kClearOfLattice : 1;
+    const int best = truest_of(image, more.near_best(clear), trials);
+    QualityChoice choice = trials.take(best);
+    return choice.errors.size() >= kFewPixels ? std::move(choice) : more.take(best);
 }
 
 QualityChoice choose_wavelets(const Image& image, int quality) {

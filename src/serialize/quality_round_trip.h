@@ -3,11 +3,22 @@
 #pragma once
 
 #include <cstdint>
+#include <span>
 #include <vector>
 
 #include "image/image.h"
 
 namespace zq {
+
+// Eight lines of a picture, in blocks.
+struct JpegBandShape {
+    std::size_t planes;
+    std::size_t blocks;  // side by side
+
+    explicit JpegBandShape(const Image& picture);
+    // Of a band, plane by plane.
+    std::size_t coefficients() const;
+};
 
 class JpegRoundTrip {
   public:
@@ -18,11 +29,12 @@ class JpegRoundTrip {
     void decode(int quality, const Image& result) const;
 
   private:
-    const std::int16_t* coefficients_of(std::size_t band, std::size_t plane) const;
-
-    std::size_t planes_;
-    std::size_t blocks_;                      // side by side
-    std::vector<std::int16_t> coefficients_;  // band by band, each plane by plane
+    JpegBandShape shape_;
+    std::vector<std::int16_t> coefficients_;  // band by band
 };
+
+// The squared error of a picture at each of several qualities. A band at a time, so that nothing of
+// the picture's size is needed.
+std::vector<double> squared_errors(const Image& picture, std::span<const int> qualities);
 
 }  // namespace zq

@@ -81,11 +81,6 @@ std::vector<int> Trials::near_best(double factor) const {
     return qualities;
 }
 
-double Trials::error(int quality) {
-    make(quality);
-    return errors_in_result().total;
-}
-
 double Trials::touched_error(int quality) {
     make(quality);
     const Errors errors = errors_in_result();

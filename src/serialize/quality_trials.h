@@ -24,14 +24,12 @@ class Trials {
     // The error that touches leave; the best quality so far is kept, of equal ones the first.
     double attempt(int quality);
     double best_left() const { return best_left_; }
-    int best_quality() const { return best_.quality; }
     // Whether `touches` itself is the truest quality, and not exact.
     bool is_truest() const;
     // Those tried that have up to so many times the best one's error.
     std::vector<int> near_best(double factor) const;
 
-    // The error without touches, and what they take away of it.
-    double error(int quality);
+    // What touches take away of the error.
     double touched_error(int quality);
 
     // What has come out best; nothing else may be called then.
