@@ -63,6 +63,18 @@ void expect_same_colours(const Image& actual, const Image& expected) {
     }
 }
 
+double squared_error(const Image& a, const Image& b) {
+    const std::ptrdiff_t bytes = bytes_per_pixel(a.type());
+    int total = 0;
+    for (std::int32_t y = 0; y < a.record().height; ++y) {
+        for (std::ptrdiff_t i = 0; i < a.record().width * bytes; ++i) {
+            if (bytes == 4 && i % 4 == 3) continue;
+            total += (a.row(y)[i] - b.row(y)[i]) * (a.row(y)[i] - b.row(y)[i]);
+        }
+    }
+    return total;
+}
+
 Bytes stream_of_libjpeg(const Image& image, int quality) {
     const bool colour = image.type() == PixelType::kRgb;
     const JpegSteps luma = colour ? luma_steps(quality) : grey_steps(quality);
@@ -160,6 +172,9 @@ TEST(QualityJpegTest, TrialsComeToWhatStreamsBringBack) {
                     const auto actual = blank(type, size);
                     JpegRoundTrip(*image).decode(quality, *actual);
                     expect_same_colours(*actual, *expected);
+                    const int qualities[] = {101 - quality, quality};
+                    ASSERT_EQ(squared_errors(*image, qualities)[1],
+                              squared_error(*image, *expected));
                 });
             }
         }
