@@ -2,7 +2,9 @@
 #include "serialize/quality_trials.h"
 
 #include <algorithm>
+#include <span>
 #include <string_view>
+#include <utility>
 
 #include "serialize/quality_payload.h"
 #include "serialize/quality_seam.h"
