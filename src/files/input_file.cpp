@@ -2,6 +2,7 @@
 #include "files/input_file.h"
 
 #include <cerrno>
+#include <limits>
 #include <utility>
 
 #include "base/checked.h"
@@ -10,12 +11,20 @@
 
 namespace zq {
 
+namespace {
+
+// Larger reads go past it.
+constexpr std::size_t kInputBuffer = std::size_t{16} * 1024;
+constexpr auto kLastPosition = static_cast<std::uint64_t>(std::numeric_limits<std::int64_t>::max());
+
+}  // namespace
+
 InputFile::InputFile(const char* path)
-    : buffer_(std::make_unique<char[]>(kStreamBuffer)), stream_(platform::open_file(path, "rb")) {
+    : buffer_(std::make_unique<char[]>(kInputBuffer)), stream_(platform::open_file(path, "rb")) {
     if (!stream_) throw code_of_errno(errno);
     size_ = platform::regular_size(stream_.get());
     // Refused only for lack of memory of the C library's own; it then goes on with its default.
-    std::setvbuf(stream_.get(), buffer_.get(), _IOFBF, kStreamBuffer);
+    std::setvbuf(stream_.get(), buffer_.get(), _IOFBF, kInputBuffer);
 }
 
 void InputFile::rewind() {
@@ -46,11 +55,15 @@ void InputFile::read_header_bytes(void* bytes, std::size_t count) {
 }
 
 void InputFile::read_rows(platform::Rows<std::uint8_t> rows) {
-    if (!try_read_rows(rows)) throw kUnableToReadData;
+    const std::int64_t here = platform::position_of(stream_.get());
+    if (here < 0 || !try_read_rows_at(static_cast<std::uint64_t>(here), rows))
+        throw kUnableToReadData;
 }
 
-bool InputFile::try_read_rows(platform::Rows<std::uint8_t> rows) noexcept {
-    return platform::read_rows(stream_.get(), rows);
+bool InputFile::try_read_rows_at(std::uint64_t offset, platform::Rows<std::uint8_t> rows) noexcept {
+    const std::uint64_t bytes = std::uint64_t{rows.row_bytes} * rows.count;
+    return std::in_range<std::int64_t>(offset) && bytes <= kLastPosition - offset &&
+           platform::read_rows(stream_.get(), static_cast<std::int64_t>(offset), rows);
 }
 
 void InputFile::require(std::uint64_t offset, std::uint64_t count) const {

@@ -36,9 +36,10 @@ class InputFile {
     // All of them, or the mapped error number is thrown (end of file: kFileIo).
     void read_header_bytes(void* bytes, std::size_t count);
 
-    // All rows from here on, or kUnableToReadData is thrown; nothing else can be read then.
+    // All rows from here on, or kUnableToReadData is thrown. The stream stays where it is.
     void read_rows(platform::Rows<std::uint8_t> rows);
-    bool try_read_rows(platform::Rows<std::uint8_t> rows) noexcept;
+    // The same from an offset. False unless all came.
+    bool try_read_rows_at(std::uint64_t offset, platform::Rows<std::uint8_t> rows) noexcept;
 
     // Throws kUnableToReadData when the file is known to end before `offset` + `count`. What a
     // header announces goes through here before memory is taken for it.

@@ -95,7 +95,7 @@ void Jpeg2000Reader::read_grey(Image& image) const {
     const Jpeg2000Component& component = layout_.main_component();
     const auto width = static_cast<std::size_t>(layout_.width());
     const bool indices = !layout_.colour_table.empty();
-    bool above_signed = false;
+    UnsignedGreyRows unsigned_rows(image);
     std::vector<std::int32_t> unused;
     for (std::int32_t y = 0; y < layout_.height(); ++y) {
         const SampleRow row = row_of(layout_.colours[0], y, unused);
@@ -104,13 +104,10 @@ void Jpeg2000Reader::read_grey(Image& image) const {
             samples_to_bytes(row, image.row(y), width);
         } else {
             samples_to_words(row, reinterpret_cast<std::uint16_t*>(image.row(y)), width);
-            above_signed = above_signed || any_above_signed(image.row(y), width * 2);
+            if (!component.is_signed) unsigned_rows.add(y, 1);
         }
     }
-    image.set_sample_offset(0);
-    if (component.is_signed || !above_signed) return;
-    shift_unsigned_samples(image, kWholeRangeOffset);
-    image.set_sample_offset(kWholeRangeOffset);
+    image.set_sample_offset(unsigned_rows.offset());
 }
 
 void Jpeg2000Reader::read_colour(Image& image) const {

@@ -50,12 +50,18 @@ bool OutputFile::try_seek(std::uint64_t offset) noexcept {
     return false;
 }
 
+bool OutputFile::try_write_rows(platform::Rows<const std::uint8_t> rows) noexcept {
+    if (platform::write_rows(stream_.get(), rows)) return true;
+    last_error_ = code_of_errno(errno);
+    return false;
+}
+
 void OutputFile::write(const void* bytes, std::size_t count) {
     if (!try_write(bytes, count)) throw last_error_;
 }
 
 void OutputFile::write_rows(platform::Rows<const std::uint8_t> rows) {
-    if (!platform::write_rows(stream_.get(), rows)) throw code_of_errno(errno);
+    if (!try_write_rows(rows)) throw last_error_;
 }
 
 bool OutputFile::close() noexcept {

@@ -29,9 +29,11 @@ class OutputFile {
     // Offset from the start. For formats that go back to what they wrote; what has no positions (a
     // pipe) cannot hold those.
     bool try_seek(std::uint64_t offset) noexcept;
+    // Behind rows nothing but rows can be written without seeking first.
+    bool try_write_rows(platform::Rows<const std::uint8_t> rows) noexcept;
     GRLIBError_enum last_error() const { return last_error_; }
 
-    // Throw the mapped error number. Nothing can be written behind rows.
+    // Throw the mapped error number.
     void write(const void* bytes, std::size_t count);
     void write_rows(platform::Rows<const std::uint8_t> rows);
 

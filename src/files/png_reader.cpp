@@ -7,7 +7,6 @@
 #include "base/checked.h"
 #include "codecs/deflate.h"
 #include "files/png_pixel_reader.h"
-#include "files/unsigned_grey.h"
 #include "files/write_job.h"
 #include "kernels/colour_rows.h"
 #include "kernels/png_samples.h"
@@ -139,8 +138,7 @@ void PngReader::set_transformations() {
     }
 }
 
-// Returns whether a sample of 16-bit grey was above what is signed.
-bool PngReader::read_uncommon(Image& image) {
+void PngReader::read_uncommon(Image& image) {
     const png_structp png = session_.png();
     int passes = 0;
     session_.run(kUnableToReadData, [this, png, &passes] {
@@ -151,18 +149,14 @@ bool PngReader::read_uncommon(Image& image) {
     const auto row_bytes =
         static_cast<std::size_t>(width()) * static_cast<std::size_t>(bytes_per_pixel(image.type()));
     if (png_get_rowbytes(png, session_.info()) != row_bytes) throw kUnableToReadData;
-    bool above_signed = false;
     session_.run(kUnableToReadData, [&] {
         for (int pass = 0; pass < passes; ++pass) {
             for (std::int32_t y = 0; y < height(); ++y) {
                 png_read_row(png, image.row(y), nullptr);
-                if (pixel_type() == PixelType::kI16 && pass + 1 == passes && !above_signed) {
-                    above_signed = any_above_signed(image.row(y), row_bytes);
-                }
+                if (unsigned_rows_ && pass + 1 == passes) unsigned_rows_->add(y, 1);
             }
         }
     });
-    return above_signed;
 }
 
 void PngReader::place_row(const std::uint8_t* from, std::uint8_t* to) const {
@@ -178,14 +172,13 @@ void PngReader::place_row(const std::uint8_t* from, std::uint8_t* to) const {
 }
 
 // libpng has read the head of the first chunk of pixels, and goes on behind the last.
-bool PngReader::read_common(Image& image) {
+void PngReader::read_common(Image& image) {
     const auto step = static_cast<std::size_t>(bits_per_pixel()) / 8;
     const std::size_t row_bytes = checked_mul<std::size_t>(width_, step);
     PngPixelReader pixels(file_, head_, row_bytes, step);
     const bool is_direct = pixel_type() == PixelType::kU8;
     std::vector<std::uint8_t> row(is_direct ? 0 : row_bytes), above(row_bytes);
     const std::uint8_t* before = above.data();
-    bool above_signed = false;
     for (std::int32_t y = 0; y < height(); ++y) {
         std::uint8_t* to = image.row(y);
         if (is_direct) {
@@ -195,9 +188,7 @@ bool PngReader::read_common(Image& image) {
         }
         pixels.read_row(above.data(), row.data());
         place_row(row.data(), to);
-        if (pixel_type() == PixelType::kI16 && !above_signed) {
-            above_signed = any_above_signed(to, row_bytes);
-        }
+        if (unsigned_rows_) unsigned_rows_->add(y, 1);
         std::swap(row, above);
     }
     head_ = pixels.finish();
@@ -207,24 +198,20 @@ bool PngReader::read_common(Image& image) {
         png_set_keep_unknown_chunks(session_.png(), PNG_HANDLE_CHUNK_NEVER,
                                     reinterpret_cast<png_const_bytep>("IDAT"), 1);
     });
-    return above_signed;
-}
-
-void PngReader::read_pixels(Image& image) {
-    const bool above_signed = is_common() ? read_common(image) : read_uncommon(image);
-    // A file that lacks its end is a file cut short.
-    session_.run(kUnableToReadData, [this] { png_read_end(session_.png(), nullptr); });
-    if (pixel_type() == PixelType::kI16) apply_sample_offset(image, above_signed);
 }
 
 // Samples are unsigned, pixels signed. A file that does not say what was subtracted from its
 // samples, and has some that are too large, comes through with all of them moved down.
-void PngReader::apply_sample_offset(Image& image, bool samples_above_signed) const {
-    const std::int32_t offset = sample_offset_.value_or(
-        static_cast<std::int16_t>(samples_above_signed ? kWholeRangeOffset : 0));
-    image.set_sample_offset(offset);
-    if (offset == 0 && !samples_above_signed) return;
-    shift_unsigned_samples(image, offset);
+void PngReader::read_pixels(Image& image) {
+    if (pixel_type() == PixelType::kI16) unsigned_rows_.emplace(image, sample_offset_);
+    if (is_common()) {
+        read_common(image);
+    } else {
+        read_uncommon(image);
+    }
+    // A file that lacks its end is a file cut short.
+    session_.run(kUnableToReadData, [this] { png_read_end(session_.png(), nullptr); });
+    if (unsigned_rows_) image.set_sample_offset(unsigned_rows_->offset());
 }
 
 }  // namespace zq

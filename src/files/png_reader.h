@@ -11,6 +11,7 @@
 #include "files/pixel_format.h"
 #include "files/png_extras.h"
 #include "files/png_session.h"
+#include "files/unsigned_grey.h"
 #include "image/image.h"
 
 namespace zq {
@@ -40,12 +41,11 @@ class PngReader {
   private:
     void check_plausible() const;
     bool is_common() const;
-    bool read_common(Image& image);
+    void read_common(Image& image);
     void place_row(const std::uint8_t* from, std::uint8_t* to) const;
-    bool read_uncommon(Image& image);
+    void read_uncommon(Image& image);
     static void read_bytes(png_structp png, png_bytep bytes, std::size_t count);
     void set_transformations();
-    void apply_sample_offset(Image& image, bool samples_above_signed) const;
 
     InputFile& file_;
     PngSession session_;
@@ -59,6 +59,7 @@ class PngReader {
     std::array<std::uint8_t, 8> head_{};
     bool head_is_next_ = false;
     std::optional<std::int16_t> sample_offset_;
+    std::optional<UnsignedGreyRows> unsigned_rows_;  // of the image being read
 };
 
 }  // namespace zq

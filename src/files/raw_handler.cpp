@@ -45,20 +45,18 @@ void RawFileHandler::read_lines(Image& image) {
         read_planes(image);
         return;
     }
-    bool above_signed = false;
+    std::optional<UnsignedGreyRows> unsigned_rows;
+    if (layout_.format == PixelFormat::kUnsigned16) unsigned_rows.emplace(image);
     std::vector<std::uint8_t> line(target_.height == 1 ? line_bytes() : stride());
     for (std::int32_t i = 0; i < target_.height; ++i) {
         const bool is_last = i + 1 == target_.height;
         input().read(line.data(), is_last ? line_bytes() : line.size(), kUnableToReadData);
         swap_samples({line.data(), line_bytes()}, layout_.swapped_bytes);
-        above_signed = above_signed || any_above_signed(line.data(), line_bytes());
         const std::int32_t y = layout_.is_bottom_up ? target_.height - 1 - i : i;
         unpack_raw_row(layout_, line.data(), image.row(y), static_cast<std::size_t>(target_.width));
+        if (unsigned_rows) unsigned_rows->add(y, 1);
     }
-    if (layout_.format == PixelFormat::kUnsigned16 && above_signed) {
-        shift_unsigned_samples(image, kWholeRangeOffset);
-        image.set_sample_offset(kWholeRangeOffset);
-    }
+    if (unsigned_rows) image.set_sample_offset(unsigned_rows->offset());
 }
 
 // Each plane is a third of the data, which may be more than the picture needs.

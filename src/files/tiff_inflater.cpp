@@ -11,8 +11,6 @@ namespace zq {
 
 namespace {
 
-constexpr std::size_t kDeflatedBytes = std::size_t{32} << 10;
-
 std::uint16_t field_of(TIFF* tiff, ttag_t tag) {
     std::uint16_t value = 0;
     TIFFGetFieldDefaulted(tiff, tag, &value);
@@ -42,19 +40,7 @@ TiffInflater::TiffInflater(TiffSession& session, const TiffLayout& layout, std::
       layout_(layout),
       row_bytes_(checked_narrow<std::size_t>(layout.row_bytes(layout.width))),
       has_differences_(field_of(session.tiff(), TIFFTAG_PREDICTOR) == PREDICTOR_HORIZONTAL),
-      position_(TIFFGetStrileOffset(session.tiff(), strip)),
-      left_(TIFFGetStrileByteCount(session.tiff(), strip)),
-      deflated_(kDeflatedBytes) {
-    if (position_ == 0) throw kUnableToReadData;
-}
-
-void TiffInflater::fetch() {
-    const auto part = static_cast<std::size_t>(std::min<std::uint64_t>(left_, deflated_.size()));
-    if (part == 0 || !session_.read_at(position_, deflated_.data(), part)) throw kUnableToReadData;
-    position_ += part;
-    left_ -= part;
-    in_ = std::span(deflated_).first(part);
-}
+      deflated_(session, strip) {}
 
 // Returns the room that is left.
 std::span<std::uint8_t> TiffInflater::inflate(std::span<std::uint8_t> room) {
@@ -62,7 +48,7 @@ std::span<std::uint8_t> TiffInflater::inflate(std::span<std::uint8_t> room) {
     const bool had_none = in_.empty();
     const std::size_t before = room.size();
     if (!stream_.inflate(in_, room)) throw kUnableToReadData;
-    if (had_none && room.size() == before && !stream_.is_finished()) fetch();
+    if (had_none && room.size() == before && !stream_.is_finished()) in_ = deflated_.next();
     return room;
 }
 

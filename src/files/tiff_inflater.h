@@ -5,11 +5,10 @@
 #include <cstddef>
 #include <cstdint>
 #include <span>
-#include <vector>
 
 #include "codecs/inflate_stream.h"
 #include "files/tiff_layout.h"
-#include "files/tiff_session.h"
+#include "files/tiff_strip_bytes.h"
 
 namespace zq {
 
@@ -18,8 +17,7 @@ class TiffInflater {
     // Whether strips of this file are deflated, and in no way but those known here.
     static bool suits(TIFF* tiff, const TiffLayout& layout);
 
-    // The session must outlive this, and its file not be used otherwise meanwhile. Throws
-    // kUnableToReadData for a strip that has no place in the file.
+    // Session and layout must outlive this. Throws as TiffStripBytes does.
     TiffInflater(TiffSession& session, const TiffLayout& layout, std::uint32_t strip);
 
     // Both throw kUnableToReadData for what is damaged or missing.
@@ -31,18 +29,15 @@ class TiffInflater {
 
   private:
     std::span<std::uint8_t> inflate(std::span<std::uint8_t> room);
-    void fetch();
     void add_up_differences(std::uint8_t* row) const;
 
     TiffSession& session_;
     const TiffLayout& layout_;
     std::size_t row_bytes_;
     bool has_differences_;  // each sample is told by its difference from the one to its left
-    std::uint64_t position_;
-    std::uint64_t left_;  // bytes that were not read yet
+    TiffStripBytes deflated_;
     InflateStream stream_;
-    std::vector<std::uint8_t> deflated_;
-    std::span<const std::uint8_t> in_;  // of those
+    std::span<const std::uint8_t> in_;
 };
 
 }  // namespace zq

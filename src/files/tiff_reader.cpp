@@ -9,7 +9,7 @@
 #include "base/checked.h"
 #include "files/orientation.h"
 #include "files/tiff_inflater.h"
-#include "files/unsigned_grey.h"
+#include "files/tiff_unpacker.h"
 #include "files/write_job.h"
 
 namespace zq {
@@ -19,6 +19,8 @@ namespace {
 // Strips up to here are decoded whole, which is faster; larger ones a few rows at a time.
 constexpr std::uint64_t kLargestWholeStrip = std::uint64_t{4} << 20;
 constexpr std::size_t kInflatedAtOnce = std::size_t{128} << 10;
+// Samples are looked at while the processor's caches have them.
+constexpr std::size_t kBand = std::size_t{256} << 10;
 constexpr std::int32_t kUnitCentimetre = 4;
 constexpr std::int32_t kUnitInch = 8;
 
@@ -113,6 +115,9 @@ void TiffReader::read_stored(Image& image) {
         read_foreign(image);
         return;
     }
+    const bool is_unsigned = layout_.number == TiffNumber::kUnsigned;
+    if (is_unsigned && image.type() == PixelType::kI16 && layout_.bits == 16)
+        unsigned_rows_.emplace(image);
     const int planes = layout_.separate ? layout_.used_samples() : 1;
     for (int plane = 0; plane < planes; ++plane) {
         if (layout_.tiled) {
@@ -121,7 +126,17 @@ void TiffReader::read_stored(Image& image) {
             read_plane_of_strips(image, plane);
         }
     }
-    finish(image);
+    if (layout_.alpha == TiffAlpha::kPremultiplied) {
+        for (std::uint32_t y = 0; y < layout_.height; ++y)
+            sink_.finish_row(pixel_of(image, 0, y), layout_.width);
+    }
+    image.set_sample_offset(unsigned_rows_ ? unsigned_rows_->offset() : 0);
+}
+
+// The rows from `y` on are complete.
+void TiffReader::rows_done(std::uint32_t y, std::uint32_t rows) {
+    if (unsigned_rows_)
+        unsigned_rows_->add(static_cast<std::int32_t>(y), static_cast<std::int32_t>(rows));
 }
 
 void TiffReader::read_plane_of_strips(const Image& image, int plane) {
@@ -129,10 +144,12 @@ void TiffReader::read_plane_of_strips(const Image& image, int plane) {
     if (static_cast<std::uint64_t>(TIFFScanlineSize(tiff)) != layout_.row_bytes(layout_.width))
         throw kInvalidFileHeader;
     const std::uint32_t most = rows_per_strip(tiff, layout_);
-    const bool uncompressed = is_uncompressed(tiff, layout_);
-    if (uncompressed && sink_.is_plain() && read_at_once(image, most)) return;
+    if (is_uncompressed(tiff, layout_)) {
+        read_uncompressed_plane(image, plane, most);
+        return;
+    }
     const bool whole = layout_.row_bytes(layout_.width) * most <= kLargestWholeStrip;
-    const auto read = uncompressed                         ? &TiffReader::read_uncompressed
+    const auto read = TiffUnpacker::suits(tiff, layout_)   ? &TiffReader::read_packed
                       : whole                              ? &TiffReader::read_strip
                       : TiffInflater::suits(tiff, layout_) ? &TiffReader::read_deflated
                                                            : &TiffReader::read_lines;
@@ -143,41 +160,72 @@ void TiffReader::read_plane_of_strips(const Image& image, int plane) {
     }
 }
 
-// Pixels that stand in the file as in the image, all rows in one run. False: they do not.
-bool TiffReader::read_at_once(const Image& image, std::uint32_t strip_rows) {
-    TIFF* const tiff = session_.tiff();
-    const auto line = checked_narrow<std::size_t>(layout_.row_bytes(layout_.width));
-    const std::uint64_t strip_bytes = std::uint64_t{line} * strip_rows;
-    const std::uint64_t start = TIFFGetStrileOffset(tiff, 0);
-    const std::uint32_t strips = (layout_.height - 1) / strip_rows + 1;
-    if (start == 0 || TIFFIsByteSwapped(tiff) != 0) return false;
-    for (std::uint32_t i = 0; i < strips; ++i) {
-        const std::uint64_t rows = std::min(strip_rows, layout_.height - i * strip_rows);
-        if (TIFFGetStrileOffset(tiff, i) != checked_add(start, i * strip_bytes) ||
-            TIFFGetStrileByteCount(tiff, i) < rows * line)
-            return false;
+void TiffReader::read_uncompressed_plane(const Image& image, int plane, std::uint32_t strip_rows) {
+    for (std::uint32_t y = 0; y < layout_.height;) {
+        const FileRows place = place_of_rows(plane, y, strip_rows);
+        read_uncompressed(image, plane, y, place);
+        y += place.count;
     }
-    if (!session_.read_rows_at(start, {image.row(0), image.row_stride(), line, layout_.height}))
-        throw kUnableToReadData;
-    return true;
 }
 
-void TiffReader::read_uncompressed(const Image& image, int plane, std::uint32_t y,
-                                   std::uint32_t rows) {
+// Strips that follow each other in the file count as one.
+TiffReader::FileRows TiffReader::place_of_rows(int plane, std::uint32_t y,
+                                               std::uint32_t strip_rows) const {
     TIFF* const tiff = session_.tiff();
-    const std::uint32_t strip = TIFFComputeStrip(tiff, y, static_cast<std::uint16_t>(plane));
-    const auto line = checked_narrow<std::size_t>(layout_.row_bytes(layout_.width));
-    const std::uint64_t start = TIFFGetStrileOffset(tiff, strip);
-    if (start == 0 || TIFFGetStrileByteCount(tiff, strip) / line < rows) throw kUnableToReadData;
+    const std::uint64_t line = layout_.row_bytes(layout_.width);
+    FileRows place{};
+    while (y + place.count < layout_.height) {
+        const std::uint32_t next = y + place.count;
+        const std::uint32_t strip = TIFFComputeStrip(tiff, next, static_cast<std::uint16_t>(plane));
+        const std::uint32_t rows = std::min(strip_rows, layout_.height - next);
+        const std::uint64_t start = TIFFGetStrileOffset(tiff, strip);
+        if (place.count == 0) place.start = start;
+        if (start != checked_add(place.start, checked_mul(std::uint64_t{place.count}, line))) break;
+        if (start == 0 || TIFFGetStrileByteCount(tiff, strip) / line < rows)
+            throw kUnableToReadData;
+        place.count += rows;
+    }
+    return place;
+}
+
+// Into the image itself where it takes samples as they are.
+void TiffReader::read_uncompressed(const Image& image, int plane, std::uint32_t y, FileRows place) {
     const bool plain = sink_.is_plain();
+    const auto line = checked_narrow<std::size_t>(layout_.row_bytes(layout_.width));
+    const std::ptrdiff_t stride = plain ? image.row_stride() : static_cast<std::ptrdiff_t>(line);
+    const std::size_t most = std::clamp<std::size_t>(kBand / line, 1, place.count);
+    buffer_.resize(plain ? 0 : most * line);
+    for (std::uint32_t done = 0; done < place.count;) {
+        const std::uint32_t rows = std::min(static_cast<std::uint32_t>(most), place.count - done);
+        const std::uint64_t start =
+            checked_add(place.start, checked_mul<std::uint64_t>(done, line));
+        std::uint8_t* const bytes = plain ? pixel_of(image, 0, y + done) : buffer_.data();
+        if (!session_.read_rows_at(start, {bytes, stride, line, rows})) throw kUnableToReadData;
+        for (std::uint32_t i = 0; i < rows; ++i)
+            session_.swap_samples({bytes + static_cast<std::ptrdiff_t>(i) * stride, line},
+                                  layout_.bits);
+        if (plain) {
+            rows_done(y + done, rows);
+        } else {
+            put_rows(image, plane, y + done, rows);
+        }
+        done += rows;
+    }
+}
+
+void TiffReader::read_packed(const Image& image, int plane, std::uint32_t y, std::uint32_t rows) {
+    TiffUnpacker unpacker(session_,
+                          TIFFComputeStrip(session_.tiff(), y, static_cast<std::uint16_t>(plane)));
+    const bool plain = sink_.is_plain();
+    const auto line = checked_narrow<std::size_t>(layout_.row_bytes(layout_.width));
     buffer_.resize(plain ? 0 : line);
     for (std::uint32_t i = 0; i < rows; ++i) {
         std::uint8_t* const row = pixel_of(image, 0, y + i);
-        std::uint8_t* const bytes = plain ? row : buffer_.data();
-        if (!session_.read_at(checked_add(start, std::uint64_t{i} * line), bytes, line))
-            throw kUnableToReadData;
-        session_.swap_samples({bytes, line}, layout_.bits);
-        if (!plain) sink_.put(plane, bytes, row, layout_.width);
+        const std::span<std::uint8_t> bytes(plain ? row : buffer_.data(), line);
+        unpacker.read_row(bytes);
+        session_.swap_samples(bytes, layout_.bits);
+        if (!plain) sink_.put(plane, bytes.data(), row, layout_.width);
+        rows_done(y + i, 1);
     }
 }
 
@@ -188,10 +236,10 @@ void TiffReader::read_deflated(const Image& image, int plane, std::uint32_t y, s
     const std::size_t most = std::clamp<std::size_t>(kInflatedAtOnce / line, 1, rows);
     buffer_.resize(line * most);
     for (std::uint32_t done = 0; done < rows;) {
-        const std::size_t count = std::min<std::size_t>(most, rows - done);
+        const auto count = static_cast<std::uint32_t>(std::min<std::size_t>(most, rows - done));
         inflater.read_rows(std::span(buffer_).first(count * line));
-        for (std::size_t i = 0; i < count; ++i, ++done)
-            sink_.put(plane, &buffer_[i * line], pixel_of(image, 0, y + done), layout_.width);
+        put_rows(image, plane, y + done, count);
+        done += count;
     }
     inflater.finish(std::uint64_t{line} * rows_per_strip(session_.tiff(), layout_));
 }
@@ -204,8 +252,7 @@ void TiffReader::read_strip(const Image& image, int plane, std::uint32_t y, std:
     const auto bytes = static_cast<tmsize_t>(buffer_.size());
     const std::uint32_t strip = TIFFComputeStrip(tiff, y, static_cast<std::uint16_t>(plane));
     if (TIFFReadEncodedStrip(tiff, strip, buffer_.data(), bytes) != bytes) throw kUnableToReadData;
-    for (std::uint32_t i = 0; i < rows; ++i)
-        sink_.put(plane, &buffer_[i * line], pixel_of(image, 0, y + i), layout_.width);
+    put_rows(image, plane, y, rows);
 }
 
 void TiffReader::read_lines(const Image& image, int plane, std::uint32_t y, std::uint32_t rows) {
@@ -215,8 +262,16 @@ void TiffReader::read_lines(const Image& image, int plane, std::uint32_t y, std:
                              static_cast<std::uint16_t>(plane)) != 1) {
             throw kUnableToReadData;
         }
-        sink_.put(plane, buffer_.data(), pixel_of(image, 0, y + i), layout_.width);
+        put_rows(image, plane, y + i, 1);
     }
+}
+
+// Whole rows from the buffer.
+void TiffReader::put_rows(const Image& image, int plane, std::uint32_t y, std::uint32_t rows) {
+    const auto line = static_cast<std::size_t>(layout_.row_bytes(layout_.width));
+    for (std::uint32_t i = 0; i < rows; ++i)
+        sink_.put(plane, &buffer_[i * line], pixel_of(image, 0, y + i), layout_.width);
+    rows_done(y, rows);
 }
 
 void TiffReader::read_plane_of_tiles(const Image& image, int plane) {
@@ -243,6 +298,8 @@ void TiffReader::read_plane_of_tiles(const Image& image, int plane) {
             for (std::uint32_t i = 0; i < rows; ++i)
                 sink_.put(plane, &buffer_[i * line], pixel_of(image, left, top + i), pixels);
         }
+        rows_done(static_cast<std::uint32_t>(y),
+                  static_cast<std::uint32_t>(std::min<std::uint64_t>(height, layout_.height - y)));
     }
 }
 
@@ -275,27 +332,6 @@ void TiffReader::read_foreign(const Image& image) {
             }
         }
         if (rows < most) break;
-    }
-}
-
-void TiffReader::finish(Image& image) const {
-    if (layout_.alpha == TiffAlpha::kPremultiplied) {
-        for (std::uint32_t y = 0; y < layout_.height; ++y)
-            sink_.finish_row(pixel_of(image, 0, y), layout_.width);
-    }
-    image.set_sample_offset(0);
-    const bool is_unsigned = layout_.number == TiffNumber::kUnsigned;
-    if (is_unsigned && image.type() == PixelType::kI16 && layout_.bits == 16)
-        apply_sample_offset(image);
-}
-
-// Some samples too large for a pixel: all move down.
-void TiffReader::apply_sample_offset(Image& image) const {
-    for (std::uint32_t y = 0; y < layout_.height; ++y) {
-        if (!any_above_signed(pixel_of(image, 0, y), std::size_t{2} * layout_.width)) continue;
-        shift_unsigned_samples(image, kWholeRangeOffset);
-        image.set_sample_offset(kWholeRangeOffset);
-        return;
     }
 }
 

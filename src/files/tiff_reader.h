@@ -9,6 +9,7 @@
 #include "files/tiff_layout.h"
 #include "files/tiff_samples.h"
 #include "files/tiff_session.h"
+#include "files/unsigned_grey.h"
 
 namespace zq {
 
@@ -33,22 +34,31 @@ class TiffReader {
     void read_pixels(Image& image);
 
   private:
+    // Rows of samples that follow each other in the file.
+    struct FileRows {
+        std::uint64_t start;
+        std::uint32_t count;
+    };
+
     std::uint8_t* pixel_of(const Image& image, std::uint32_t x, std::uint32_t y) const;
     void read_stored(Image& image);
     void read_foreign(const Image& image);
     void read_plane_of_strips(const Image& image, int plane);
-    bool read_at_once(const Image& image, std::uint32_t strip_rows);
-    void read_uncompressed(const Image& image, int plane, std::uint32_t y, std::uint32_t rows);
+    FileRows place_of_rows(int plane, std::uint32_t y, std::uint32_t strip_rows) const;
+    void read_uncompressed_plane(const Image& image, int plane, std::uint32_t strip_rows);
+    void read_uncompressed(const Image& image, int plane, std::uint32_t y, FileRows place);
+    void read_packed(const Image& image, int plane, std::uint32_t y, std::uint32_t rows);
     void read_deflated(const Image& image, int plane, std::uint32_t y, std::uint32_t rows);
     void read_strip(const Image& image, int plane, std::uint32_t y, std::uint32_t rows);
     void read_lines(const Image& image, int plane, std::uint32_t y, std::uint32_t rows);
     void read_plane_of_tiles(const Image& image, int plane);
-    void finish(Image& image) const;
-    void apply_sample_offset(Image& image) const;
+    void put_rows(const Image& image, int plane, std::uint32_t y, std::uint32_t rows);
+    void rows_done(std::uint32_t y, std::uint32_t rows);
 
     TiffSession session_;
     TiffLayout layout_;
     TiffSampleSink sink_;
+    std::optional<UnsignedGreyRows> unsigned_rows_;  // of the image being read
     std::vector<std::uint8_t> buffer_;  // a row, a strip or a tile as libtiff delivers it
 };
 

@@ -62,12 +62,14 @@ tmsize_t memory_limit(std::uint64_t file_size) {
 }  // namespace
 
 bool TiffStream::seek(std::uint64_t offset) noexcept {
-    if (offset == position) return true;
+    if (offset == position && !is_behind_rows) return true;
     const bool done = input != nullptr    ? input->try_seek(offset)
                       : output != nullptr ? output->try_seek(offset)
                                           : false;
-    if (done) position = offset;
-    return done;
+    if (!done) return false;
+    position = offset;
+    is_behind_rows = false;
+    return true;
 }
 
 std::size_t TiffStream::read(void* bytes, std::size_t count) noexcept {
@@ -79,10 +81,18 @@ std::size_t TiffStream::read(void* bytes, std::size_t count) noexcept {
 }
 
 std::size_t TiffStream::write(const void* bytes, std::size_t count) noexcept {
-    if (output == nullptr || !output->try_write(bytes, count)) return 0;
+    if (output == nullptr) return 0;
+    const bool done =
+        bytes == rows.first ? write_rows() : seek(position) && output->try_write(bytes, count);
+    if (!done) return 0;
     position += count;
     size = std::max(size, position);
     return count;
+}
+
+bool TiffStream::write_rows() noexcept {
+    is_behind_rows = true;
+    return output->try_write_rows(rows);
 }
 
 TiffSession::TiffSession(InputFile& file) {
@@ -119,12 +129,19 @@ TiffSession::~TiffSession() {
     if (tiff_ != nullptr) TIFFClose(tiff_);
 }
 
-bool TiffSession::read_at(std::uint64_t offset, void* bytes, std::size_t count) noexcept {
-    return stream_.seek(offset) && stream_.read(bytes, count) == count;
+bool TiffSession::read_rows_at(std::uint64_t offset, platform::Rows<std::uint8_t> rows) noexcept {
+    return stream_.input != nullptr && stream_.input->try_read_rows_at(offset, rows);
 }
 
-bool TiffSession::read_rows_at(std::uint64_t offset, platform::Rows<std::uint8_t> rows) noexcept {
-    return stream_.seek(offset) && stream_.input->try_read_rows(rows);
+// libtiff hands on the address of a raw strip without looking at what is there.
+bool TiffSession::write_strip(std::uint32_t strip,
+                              platform::Rows<const std::uint8_t> rows) noexcept {
+    stream_.rows = rows;
+    const auto bytes = static_cast<tmsize_t>(rows.row_bytes * rows.count);
+    const bool done =
+        TIFFWriteRawStrip(tiff_, strip, const_cast<std::uint8_t*>(rows.first), bytes) == bytes;
+    stream_.rows = {};
+    return done;
 }
 
 void TiffSession::swap_samples(std::span<std::uint8_t> bytes, int bits) const {

@@ -19,10 +19,14 @@ struct TiffStream {
     std::uint64_t position = 0;
     std::uint64_t size = 0;
     bool short_read = false;  // some read came to the end of the file
+    // What write() is to take for the bytes of `rows.first`: all of the rows.
+    platform::Rows<const std::uint8_t> rows{};
+    bool is_behind_rows = false;  // the file has to seek before it can go on
 
     bool seek(std::uint64_t offset) noexcept;
     std::size_t read(void* bytes, std::size_t count) noexcept;
     std::size_t write(const void* bytes, std::size_t count) noexcept;
+    bool write_rows() noexcept;
 };
 
 class TiffSession {
@@ -40,10 +44,11 @@ class TiffSession {
     TIFF* tiff() const { return tiff_; }
     std::uint64_t file_size() const { return stream_.size; }
 
-    // Bytes of the file itself. False unless all of them came.
-    bool read_at(std::uint64_t offset, void* bytes, std::size_t count) noexcept;
-    // The same for rows; nothing else of the file can be read afterwards.
+    // Rows of the file itself, past the stream's buffer. False unless all of them came.
     bool read_rows_at(std::uint64_t offset, platform::Rows<std::uint8_t> rows) noexcept;
+    // A strip of samples as they are; they go from their rows to the file without a copy. False on
+    // a failure.
+    bool write_strip(std::uint32_t strip, platform::Rows<const std::uint8_t> rows) noexcept;
     // Samples of the file itself, of so many bits, into the machine's byte order.
     void swap_samples(std::span<std::uint8_t> bytes, int bits) const;
 

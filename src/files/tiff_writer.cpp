@@ -220,16 +220,31 @@ void TiffWriter::copy_row(std::int32_t y, std::uint8_t* to) const {
     }
 }
 
+// The file has the samples as they are in memory.
+bool TiffWriter::is_direct() const {
+    return compression_ == COMPRESSION_NONE && samples_ == 1 && grey16_ != Grey16::kShifted &&
+           (bits_ == 8 || TIFFIsByteSwapped(session_.tiff()) == 0);
+}
+
+void TiffWriter::write_strip(std::uint32_t index, std::int32_t y, std::uint32_t rows) {
+    if (is_direct()) {
+        require(session_.write_strip(index,
+                                     {job_.pixels.row(y), job_.pixels.stride, row_bytes_, rows}));
+        return;
+    }
+    strip_.resize(row_bytes_ * rows);
+    for (std::uint32_t i = 0; i < rows; ++i)
+        copy_row(y + static_cast<std::int32_t>(i), &strip_[i * row_bytes_]);
+    require(TIFFWriteEncodedStrip(session_.tiff(), index, strip_.data(),
+                                  static_cast<tmsize_t>(strip_.size())) != -1);
+}
+
 void TiffWriter::write_rows() {
     const auto height = static_cast<std::uint32_t>(job_.pixels.height);
-    std::vector<std::uint8_t> strip(row_bytes_ * std::min(strip_rows_, height));
     std::uint32_t index = 0;
     for (std::uint32_t y = 0; y < height; ++index) {
         const std::uint32_t rows = std::min(strip_rows_, height - y);
-        for (std::uint32_t i = 0; i < rows; ++i)
-            copy_row(static_cast<std::int32_t>(y + i), &strip[i * row_bytes_]);
-        require(TIFFWriteEncodedStrip(session_.tiff(), index, strip.data(),
-                                      static_cast<tmsize_t>(rows * row_bytes_)) != -1);
+        write_strip(index, static_cast<std::int32_t>(y), rows);
         y += rows;
     }
 }

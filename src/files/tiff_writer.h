@@ -33,6 +33,8 @@ class TiffWriter {
     void set_colour_map();
     void set_resolution();
     void choose_grey16();
+    bool is_direct() const;
+    void write_strip(std::uint32_t index, std::int32_t y, std::uint32_t rows);
     void copy_row(std::int32_t y, std::uint8_t* to) const;
 
     OutputFile& file_;
@@ -45,6 +47,7 @@ class TiffWriter {
     Grey16 grey16_ = Grey16::kAsIs;
     std::size_t row_bytes_;
     std::uint32_t strip_rows_ = 0;
+    std::vector<std::uint8_t> strip_;
 };
 
 }  // namespace zq

@@ -2,9 +2,9 @@
 #include "files/unsigned_grey.h"
 
 #include <algorithm>
-#include <limits>
 
 #include "kernels/grey_range.h"
+#include "kernels/shift_samples.h"
 
 namespace zq {
 
@@ -15,16 +15,33 @@ bool any_above_signed(const std::uint8_t* row, std::size_t bytes) {
     return range.least < 0;
 }
 
-void shift_unsigned_samples(Image& image, std::int32_t offset) {
-    constexpr std::int32_t kLowest = std::numeric_limits<std::int16_t>::min();
-    constexpr std::int32_t kHighest = std::numeric_limits<std::int16_t>::max();
-    for (std::int32_t y = 0; y < image.record().height; ++y) {
-        auto* samples = reinterpret_cast<std::uint16_t*>(image.row(y));
-        for (std::int32_t x = 0; x < image.record().width; ++x) {
-            const std::int32_t value = samples[x] + offset;
-            samples[x] = static_cast<std::uint16_t>(std::clamp(value, kLowest, kHighest));
-        }
+UnsignedGreyRows::UnsignedGreyRows(Image& image, std::optional<std::int32_t> offset)
+    : image_(image), offset_(offset) {}
+
+void UnsignedGreyRows::add(std::int32_t first, std::int32_t count) {
+    const std::int32_t last = first + count;
+    first_ = first_ == last_ ? first : std::min(first_, first);
+    last_ = std::max(last_, last);
+    if (offset_) {
+        shift(first, last);
+    } else if (any_above_signed_in(first, last)) {
+        offset_ = kWholeRangeOffset;
+        shift(first_, last_);
     }
+}
+
+bool UnsignedGreyRows::any_above_signed_in(std::int32_t first, std::int32_t last) const {
+    const std::size_t bytes = std::size_t{2} * static_cast<std::size_t>(image_.record().width);
+    for (std::int32_t y = first; y < last; ++y) {
+        if (any_above_signed(image_.row(y), bytes)) return true;
+    }
+    return false;
+}
+
+void UnsignedGreyRows::shift(std::int32_t first, std::int32_t last) {
+    const auto width = static_cast<std::size_t>(image_.record().width);
+    for (std::int32_t y = first; y < last; ++y)
+        shift_samples(reinterpret_cast<std::uint16_t*>(image_.row(y)), width, *offset_);
 }
 
 }  // namespace zq

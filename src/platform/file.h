@@ -15,6 +15,9 @@ std::FILE* open_file(const char* path, const char* mode);
 // position stays.
 std::int64_t regular_size(std::FILE* stream);
 
+// Where an open stream stands, in bytes from the start; -1 with errno set when it cannot tell.
+std::int64_t position_of(std::FILE* stream);
+
 // What stands at a path now (symbolic links followed).
 enum class PathKind { kAbsent, kRegular, kOther };
 PathKind path_kind(const char* path);

@@ -16,9 +16,11 @@ struct Rows {
     std::size_t count;
 };
 
-// Both begin where the stream stands, go past its buffer, and leave it fit for nothing but closing.
-// False with errno set on a failure, 0 at the end of the file.
-bool read_rows(std::FILE* stream, Rows<std::uint8_t> rows);
+// Both go past the stream's buffer. False with errno set on a failure, 0 at the end of the file.
+// From an offset in the file; the stream stays where it is.
+bool read_rows(std::FILE* stream, std::int64_t offset, Rows<std::uint8_t> rows);
+// To where the stream stands, which is fit for nothing but the same again, seeking to an offset and
+// closing afterwards.
 bool write_rows(std::FILE* stream, Rows<const std::uint8_t> rows);
 
 }  // namespace zq::platform

@@ -142,6 +142,67 @@ TEST_F(TiffReadTest, ReadsEveryLayout) {
     }
 }
 
+// Runs of every length, and bytes that mean nothing; they do not heed the ends of rows.
+Bytes packed_runs(size_t length, std::mt19937& random, Bytes& plain) {
+    Bytes stream;
+    while (plain.size() < length) {
+        const size_t count = std::min<size_t>(random() % 128 + 1, length - plain.size());
+        if (random() % 5 == 0) stream += '\x80';
+        if (count > 1 && random() % 2 == 0) {
+            const auto value = static_cast<char>(random());
+            plain.append(count, value);
+            stream += {static_cast<char>(257 - count), value};
+        } else {
+            stream += static_cast<char>(count - 1);
+            for (size_t i = 0; i < count; ++i) plain += static_cast<char>(random());
+            stream += plain.substr(plain.size() - count);
+        }
+    }
+    return stream;
+}
+
+TEST_F(TiffReadTest, UnpacksRunsThatGoOnFromRowToRow) {
+    std::mt19937 random(11);
+    struct Case {
+        uint32_t photometric, bits, samples;
+        int32_t type;
+    };
+    for (const Case& c : {Case{1, 8, 1, ZQ_TYPE_U8}, Case{1, 16, 1, ZQ_TYPE_I16},
+                          Case{2, 8, 3, ZQ_TYPE_RGB}, Case{2, 16, 3, ZQ_TYPE_RGBU64}}) {
+        for (const uint32_t variant : {0U, 1U, 2U, 3U, 4U, 5U}) {
+            SCOPED_TRACE(testing::Message() << c.type << ", variant " << variant);
+            const uint32_t width = Samples{3, 97, 500}[variant % 3], height = 90, strip_rows = 70;
+            const size_t line = size_t{width} * c.samples * c.bits / 8;
+            BareTiff bare = bare_tiff(width, height, c.photometric, Samples(c.samples, c.bits));
+            bare.big_endian = variant % 2 == 1;
+            bare.fields[278].values = {strip_rows};
+            BareTiff with_runs = bare;
+            with_runs.fields[259] = {kTiffShort, {32773}};
+            bare.strips.clear();
+            with_runs.strips.clear();
+            for (const uint32_t rows : {strip_rows, height - strip_rows}) {
+                Bytes plain;
+                with_runs.strips.push_back(packed_runs(line * rows, random, plain));
+                bare.strips.push_back(plain);
+            }
+            Picture expected(ZQ_TYPE_U8), target(ZQ_TYPE_U8);
+            store(bare);
+            ASSERT_EQ(read(expected), 0);
+            store(with_runs);
+            ASSERT_EQ(read(target), 0);
+            EXPECT_EQ(target.record().type, c.type);
+            EXPECT_EQ(target.state(), expected.state());
+            EXPECT_EQ(sample_offset(target), sample_offset(expected));
+
+            const Bytes before = target.state();
+            with_runs.strips.back().pop_back();
+            store(with_runs);
+            EXPECT_EQ(read(target), kUnreadable);
+            EXPECT_EQ(target.state(), before);
+        }
+    }
+}
+
 Bytes deflated(const Bytes& plain) {
     Bytes stream(compressBound(static_cast<uLong>(plain.size())), '\0');
     auto length = static_cast<uLongf>(stream.size());

@@ -18,6 +18,7 @@
 #include "platform/file.h"
 #include "platform/module.h"
 #include "platform/mutex.h"
+#include "platform/row_io.h"
 #include "platform/string_resource.h"
 #include "platform/thread.h"
 #include "support/foreign_slot/foreign_slot.h"
@@ -283,6 +284,39 @@ TEST_F(PlatformFile, SizeOfAnOpenFileLeavesThePosition) {
     EXPECT_EQ(std::fgetc(stream.get()), '2');
     EXPECT_EQ(open_file(path("absent").c_str(), "rb"), nullptr);
     EXPECT_EQ(errno, ENOENT);
+}
+
+TEST_F(PlatformFile, RowsFromAnOffsetLeaveTheStreamWhereItIs) {
+    const Stream stream(open_file(write("file", "0123456789").c_str(), "rb"), std::fclose);
+    ASSERT_NE(stream, nullptr);
+    EXPECT_EQ(std::fgetc(stream.get()), '0');
+    std::array<std::uint8_t, 6> rows{};
+    rows.fill('-');
+    EXPECT_TRUE(read_rows(stream.get(), 5, {rows.data(), 3, 2, 2}));
+    EXPECT_EQ(std::string(rows.begin(), rows.end()), "56-78-");
+    EXPECT_EQ(std::fgetc(stream.get()), '1');
+    EXPECT_TRUE(read_rows(stream.get(), 1, {rows.data() + 3, -3, 1, 2}));
+    EXPECT_EQ(std::string(rows.begin(), rows.end()), "26-18-");
+    EXPECT_FALSE(read_rows(stream.get(), 8, {rows.data(), 3, 3, 1}));
+    EXPECT_EQ(position_of(stream.get()), 2);
+    EXPECT_EQ(std::fgetc(stream.get()), '2');
+}
+
+TEST_F(PlatformFile, AfterRowsAStreamSeeksAndGoesOn) {
+    const std::string name = path("file");
+    Stream stream(open_file(name.c_str(), "wb"), std::fclose);
+    ASSERT_NE(stream, nullptr);
+    const std::array<std::uint8_t, 6> bytes = {'a', 'b', '-', 'c', 'd', '-'};
+    std::fputs("0123", stream.get());
+    EXPECT_TRUE(write_rows(stream.get(), {bytes.data(), 3, 2, 2}));
+    EXPECT_TRUE(write_rows(stream.get(), {bytes.data() + 3, -3, 1, 2}));
+    EXPECT_EQ(std::fseek(stream.get(), 10, SEEK_SET), 0);
+    std::fputs("end", stream.get());
+    EXPECT_EQ(std::fseek(stream.get(), 2, SEEK_SET), 0);
+    std::fputs("xy", stream.get());
+    stream.reset();
+    std::ifstream file(name, std::ios::binary);
+    EXPECT_EQ(std::string(std::istreambuf_iterator<char>(file), {}), "01xyabcdcaend");
 }
 
 TEST_F(PlatformFile, ResolvesLinksSoThatTheirTargetIsReplaced) {

@@ -43,6 +43,10 @@ std::int64_t regular_size(std::FILE* stream) {
     return status.st_size;
 }
 
+std::int64_t position_of(std::FILE* stream) {
+    return ftello(stream);
+}
+
 PathKind path_kind(const char* path) {
     struct stat status {};
     if (stat(path, &status) != 0) return PathKind::kAbsent;

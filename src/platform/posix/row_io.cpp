@@ -14,9 +14,10 @@ namespace {
 // Well below what any system takes at once, and enough to make the calls cheap.
 constexpr std::size_t kMostPieces = 256;
 
-using Transfer = ssize_t (*)(int, const iovec*, int);
-
-bool transfer_rows(int file, Rows<std::uint8_t> rows, Transfer transfer) {
+// transfer(done, pieces, count) moves what follows the first `done` bytes; as readv and writev do,
+// it returns how much.
+template <class Transfer>
+bool transfer_rows(Rows<std::uint8_t> rows, const Transfer& transfer) {
     if (rows.stride == static_cast<std::ptrdiff_t>(rows.row_bytes)) {
         rows.row_bytes *= rows.count;
         rows.count = 1;
@@ -31,7 +32,7 @@ bool transfer_rows(int file, Rows<std::uint8_t> rows, Transfer transfer) {
             auto* first = rows.first + static_cast<std::ptrdiff_t>(row + i) * rows.stride;
             pieces[i] = {first + skip, rows.row_bytes - skip};
         }
-        const ssize_t moved = transfer(file, pieces.data(), static_cast<int>(count));
+        const ssize_t moved = transfer(done, pieces.data(), static_cast<int>(count));
         if (moved < 0 && errno == EINTR) continue;
         if (moved == 0) errno = 0;
         if (moved <= 0) return false;
@@ -42,17 +43,21 @@ bool transfer_rows(int file, Rows<std::uint8_t> rows, Transfer transfer) {
 
 }  // namespace
 
-bool read_rows(std::FILE* stream, Rows<std::uint8_t> rows) {
-    // The system's position is ahead of the stream's by what the stream has buffered.
-    const off_t position = ftello(stream);
-    if (position < 0 || lseek(fileno(stream), position, SEEK_SET) < 0) return false;
-    return transfer_rows(fileno(stream), rows, readv);
+bool read_rows(std::FILE* stream, std::int64_t offset, Rows<std::uint8_t> rows) {
+    const int file = fileno(stream);
+    return transfer_rows(rows, [file, offset](std::size_t done, const iovec* pieces, int count) {
+        return preadv(file, pieces, count, offset + static_cast<off_t>(done));
+    });
 }
 
 bool write_rows(std::FILE* stream, Rows<const std::uint8_t> rows) {
     if (std::fflush(stream) != 0) return false;
     auto* first = const_cast<std::uint8_t*>(rows.first);  // what iovec wants; only read here
-    return transfer_rows(fileno(stream), {first, rows.stride, rows.row_bytes, rows.count}, writev);
+    const int file = fileno(stream);
+    return transfer_rows({first, rows.stride, rows.row_bytes, rows.count},
+                         [file](std::size_t, const iovec* pieces, int count) {
+                             return writev(file, pieces, count);
+                         });
 }
 
 }  // namespace zq::platform

@@ -70,6 +70,10 @@ std::int64_t regular_size(std::FILE* stream) {
     return status.st_size;
 }
 
+std::int64_t position_of(std::FILE* stream) {
+    return _ftelli64(stream);
+}
+
 PathKind path_kind(const char* path) {
     const DWORD attributes = GetFileAttributesA(path);
     if (attributes == INVALID_FILE_ATTRIBUTES) return PathKind::kAbsent;

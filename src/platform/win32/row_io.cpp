@@ -59,13 +59,7 @@ std::vector<std::uint8_t> make_block(std::size_t row_bytes) {
     return std::vector<std::uint8_t>(std::max(kBlockBytes, row_bytes));
 }
 
-}  // namespace
-
-bool read_rows(std::FILE* stream, Rows<std::uint8_t> given) {
-    const Rows<std::uint8_t> rows = joined(given);
-    const int file = _fileno(stream);
-    const std::int64_t position = _ftelli64(stream);
-    if (position < 0 || _lseeki64(file, position, SEEK_SET) < 0) return false;
+bool read_joined(int file, const Rows<std::uint8_t>& rows) {
     if (rows.row_bytes == 0 || rows.count == 0) return true;
     if (rows.count == 1) return read_all(file, rows.first, rows.row_bytes);
     std::vector<std::uint8_t> block = make_block(rows.row_bytes);
@@ -76,6 +70,20 @@ bool read_rows(std::FILE* stream, Rows<std::uint8_t> given) {
         }
         return true;
     });
+}
+
+}  // namespace
+
+// The stream counts on the file's position to be that behind its buffer.
+bool read_rows(std::FILE* stream, std::int64_t offset, Rows<std::uint8_t> rows) {
+    const int file = _fileno(stream);
+    const std::int64_t behind_buffer = _telli64(file);
+    if (behind_buffer < 0 || _lseeki64(file, offset, SEEK_SET) < 0) return false;
+    const bool done = read_joined(file, joined(rows));
+    const int reason = errno;
+    if (_lseeki64(file, behind_buffer, SEEK_SET) < 0) return false;
+    errno = reason;
+    return done;
 }
 
 bool write_rows(std::FILE* stream, Rows<const std::uint8_t> given) {
