@@ -30,6 +30,10 @@ inline double median(std::vector<double> values) {
     return *middle;
 }
 
+inline double least(const std::vector<double>& values) {
+    return *std::min_element(values.begin(), values.end());
+}
+
 // Reports medians in milliseconds, and the ratio of the medians: of the time that passed, and of
 // the processor's, which other programs on the machine disturb less.
 template <class Ours, class Baseline>

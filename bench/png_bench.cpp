@@ -167,7 +167,7 @@ BENCHMARK(PngWrite)
     ->ArgsProduct({{0, 1, 2, 3}, {0, 11, 24, 30, 46, 60, kUsualStrength, 96}})
     ->UseManualTime()
     ->Unit(benchmark::kMillisecond)
-    ->Iterations(1);
+    ->Iterations(5);
 BENCHMARK(PngRead)->ArgName("kind")->DenseRange(0, 3)->Apply(zqbench::timed_file);
 BENCHMARK(PngVariantRead)->DenseRange(0, std::ssize(kVariants) - 1)->Apply(zqbench::timed_file);
 BENCHMARK(PngVisionWrite)

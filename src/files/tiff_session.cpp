@@ -16,6 +16,9 @@ namespace {
 constexpr std::uint64_t kLeastLimit = std::uint64_t{8} << 20;
 constexpr std::uint64_t kLimitFactor = 64;
 
+// Much more than a call to the system costs, and still in the caches.
+constexpr std::size_t kMostWaiting = std::size_t{1} << 20;
+
 TiffStream& stream_of(thandle_t handle) {
     return *static_cast<TiffStream*>(handle);
 }
@@ -62,7 +65,10 @@ tmsize_t memory_limit(std::uint64_t file_size) {
 }  // namespace
 
 bool TiffStream::seek(std::uint64_t offset) noexcept {
-    if (offset == position && !is_behind_rows) return true;
+    return offset == position || (write_waiting() && move_to(offset));
+}
+
+bool TiffStream::move_to(std::uint64_t offset) noexcept {
     const bool done = input != nullptr    ? input->try_seek(offset)
                       : output != nullptr ? output->try_seek(offset)
                                           : false;
@@ -82,17 +88,37 @@ std::size_t TiffStream::read(void* bytes, std::size_t count) noexcept {
 
 std::size_t TiffStream::write(const void* bytes, std::size_t count) noexcept {
     if (output == nullptr) return 0;
-    const bool done =
-        bytes == rows.first ? write_rows() : seek(position) && output->try_write(bytes, count);
-    if (!done) return 0;
+    if (!(bytes == rows.first ? take_rows() : write_bytes(bytes, count))) return 0;
     position += count;
     size = std::max(size, position);
     return count;
 }
 
-bool TiffStream::write_rows() noexcept {
+bool TiffStream::write_bytes(const void* bytes, std::size_t count) noexcept {
+    if (!write_waiting()) return false;
+    if (is_behind_rows && !move_to(position)) return false;
+    return output->try_write(bytes, count);
+}
+
+bool TiffStream::take_rows() noexcept {
+    const auto behind = [](const platform::Rows<const std::uint8_t>& some) {
+        return some.first + some.stride * static_cast<std::ptrdiff_t>(some.count);
+    };
+    const bool goes_on = waiting.count > 0 && rows.stride == waiting.stride &&
+                         rows.row_bytes == waiting.row_bytes && rows.first == behind(waiting);
+    if (!goes_on && !write_waiting()) return false;
+    const std::size_t before = waiting.count;
+    if (!goes_on) waiting = rows;
+    waiting.count = before + rows.count;
+    return waiting.count * waiting.row_bytes < kMostWaiting || write_waiting();
+}
+
+bool TiffStream::write_waiting() noexcept {
+    if (waiting.count == 0) return true;
+    const bool done = output != nullptr && output->try_write_rows(waiting);
     is_behind_rows = true;
-    return output->try_write_rows(rows);
+    waiting = {};
+    return done;
 }
 
 TiffSession::TiffSession(InputFile& file) {

@@ -21,12 +21,20 @@ struct TiffStream {
     bool short_read = false;  // some read came to the end of the file
     // What write() is to take for the bytes of `rows.first`: all of the rows.
     platform::Rows<const std::uint8_t> rows{};
+    // Rows that write() took and that are not in the file yet, as the system takes many at once at
+    // less cost. They end at `position`.
+    platform::Rows<const std::uint8_t> waiting{};
     bool is_behind_rows = false;  // the file has to seek before it can go on
 
     bool seek(std::uint64_t offset) noexcept;
     std::size_t read(void* bytes, std::size_t count) noexcept;
     std::size_t write(const void* bytes, std::size_t count) noexcept;
-    bool write_rows() noexcept;
+
+  private:
+    bool move_to(std::uint64_t offset) noexcept;
+    bool write_bytes(const void* bytes, std::size_t count) noexcept;
+    bool take_rows() noexcept;
+    bool write_waiting() noexcept;
 };
 
 class TiffSession {
@@ -46,8 +54,9 @@ class TiffSession {
 
     // Rows of the file itself, past the stream's buffer. False unless all of them came.
     bool read_rows_at(std::uint64_t offset, platform::Rows<std::uint8_t> rows) noexcept;
-    // A strip of samples as they are; they go from their rows to the file without a copy. False on
-    // a failure.
+    // A strip of samples as they are; they go from their rows to the file without a copy, at the
+    // latest with the directory, and must stay until then. False on a failure, also of a strip
+    // before.
     bool write_strip(std::uint32_t strip, platform::Rows<const std::uint8_t> rows) noexcept;
     // Samples of the file itself, of so many bits, into the machine's byte order.
     void swap_samples(std::span<std::uint8_t> bytes, int bits) const;

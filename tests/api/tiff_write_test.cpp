@@ -34,6 +34,7 @@ TEST_F(TiffWriteTest, CutsPicturesIntoStripsOfTheirRows) {
     for (const Case& c :
          {Case{ZQ_TYPE_U8, 301, 700, false, 4}, Case{ZQ_TYPE_U8, 70000, 3, false, 3},
           Case{ZQ_TYPE_I16, 301, 300, true, 3}, Case{ZQ_TYPE_I16, 301, 300, false, 3},
+          Case{ZQ_TYPE_U8, 1301, 2003, false, 41}, Case{ZQ_TYPE_I16, 701, 1801, true, 40},
           Case{ZQ_TYPE_U8, 1, 1, false, 1}}) {
         SCOPED_TRACE(testing::Message() << c.type << ' ' << c.width << 'x' << c.height);
         Picture picture(c.type, c.width, c.height);

@@ -34,7 +34,7 @@ class FileSizeLimit {
 };
 
 TEST(DiskFull, KeepsTheOldFileAndLeavesNoOther) {
-    zqtest::Picture picture(ZQ_TYPE_U8, 600, 500);
+    zqtest::Picture picture(ZQ_TYPE_U8, 1300, 1000);
     for (const char* type : {"AIPD", "PNG", "BMP", "JPEG", "TIFF", "JPEG2000"}) {
         for (const rlim_t limit : {0, 100, 511, 512, 513, 70000, 100000}) {
             for (const bool existed : {false, true}) {
