@@ -3,6 +3,8 @@
 
 #include <algorithm>
 #include <array>
+#include <optional>
+#include <vector>
 
 #include "files/unsigned_grey.h"
 
@@ -33,6 +35,39 @@ class Covering {
 
   private:
     std::int64_t main_step_, step_, main_first_, first_, last_;
+};
+
+// Rows of a component at the picture's width, those of OpenJPEG itself or, where the component has
+// fewer samples than the picture, a copy that the next row takes the place of.
+class ComponentRows {
+  public:
+    ComponentRows(const opj_image_t& image, const Jpeg2000Layout& layout, std::size_t index)
+        : samples_(image.comps[index]) {
+        const Jpeg2000Component& own = layout.stream.components[index];
+        const Jpeg2000Component& main = layout.main_component();
+        if (own.dx == main.dx && own.dy == main.dy) return;
+        const Jpeg2000Grid& grid = layout.stream.grid;
+        line_.emplace(grid.top, main.dy, own.dy, samples_.h);
+        const Covering column(grid.left, main.dx, own.dx, samples_.w);
+        wide_.resize(static_cast<std::size_t>(layout.width()));
+        columns_.resize(wide_.size());
+        for (std::size_t x = 0; x < columns_.size(); ++x)
+            columns_[x] = static_cast<std::uint32_t>(column(static_cast<std::int64_t>(x)));
+    }
+
+    SampleRow row(std::int32_t y) {
+        if (!line_) return samples_.data + static_cast<std::size_t>(y) * samples_.w;
+        const std::int32_t* const row = samples_.data + (*line_)(y)*samples_.w;
+        std::transform(columns_.begin(), columns_.end(), wide_.begin(),
+                       [row](std::uint32_t x) { return row[x]; });
+        return wide_.data();
+    }
+
+  private:
+    const opj_image_comp_t& samples_;
+    std::optional<Covering> line_;  // none: as many samples as the picture
+    std::vector<std::uint32_t> columns_;
+    std::vector<std::int32_t> wide_;
 };
 
 }  // namespace
@@ -73,32 +108,15 @@ void Jpeg2000Reader::check_component(std::size_t index) const {
     }
 }
 
-// As many samples as the picture is wide; where the component has fewer, `wide` holds them.
-SampleRow Jpeg2000Reader::row_of(std::size_t index, std::int32_t y,
-                                 std::vector<std::int32_t>& wide) const {
-    const opj_image_comp_t& samples = samples_->comps[index];
-    const Jpeg2000Component& own = layout_.stream.components[index];
-    const Jpeg2000Component& main = layout_.main_component();
-    if (own.dx == main.dx && own.dy == main.dy)
-        return samples.data + static_cast<std::size_t>(y) * samples.w;
-    const Jpeg2000Grid& grid = layout_.stream.grid;
-    const Covering column(grid.left, main.dx, own.dx, samples.w);
-    const Covering line(grid.top, main.dy, own.dy, samples.h);
-    const std::int32_t* const row = samples.data + line(y) * samples.w;
-    wide.resize(static_cast<std::size_t>(layout_.width()));
-    for (std::size_t x = 0; x < wide.size(); ++x)
-        wide[x] = row[column(static_cast<std::int64_t>(x))];
-    return wide.data();
-}
-
 void Jpeg2000Reader::read_grey(Image& image) const {
     const Jpeg2000Component& component = layout_.main_component();
     const auto width = static_cast<std::size_t>(layout_.width());
     const bool indices = !layout_.colour_table.empty();
     UnsignedGreyRows unsigned_rows(image);
-    std::vector<std::int32_t> unused;
-    for (std::int32_t y = 0; y < layout_.height(); ++y) {
-        const SampleRow row = row_of(layout_.colours[0], y, unused);
+    ComponentRows rows(*samples_, layout_, layout_.colours[0]);
+    const std::int32_t height = layout_.height();
+    for (std::int32_t y = 0; y < height; ++y) {
+        const SampleRow row = rows.row(y);
         if (image.type() == PixelType::kU8) {
             if (!indices) spread_samples(row, width, component.bits, 8);
             samples_to_bytes(row, image.row(y), width);
@@ -118,20 +136,24 @@ void Jpeg2000Reader::read_colour(Image& image) const {
     const bool premultiplied = layout_.alpha_kind == Jpeg2000Alpha::kPremultiplied;
     // Grey with alpha has one row for all.
     const std::size_t rows = layout_.colours[1] == layout_.colours[0] ? 1 : 3;
-    std::array<std::vector<std::int32_t>, 4> wide;
+    std::vector<ComponentRows> colours;
+    for (std::size_t i = 0; i < rows; ++i)
+        colours.emplace_back(*samples_, layout_, layout_.colours[i]);
+    std::optional<ComponentRows> opacities;
+    if (alpha) opacities.emplace(*samples_, layout_, layout_.alpha);
+    const int alpha_bits = layout_.stream.components[layout_.alpha].bits;
     const auto finish = [&](auto* to, const std::array<SampleRow, 3>& rgb, SampleRow opacity) {
         samples_to_colour(rgb, opacity, to, width);
         if (premultiplied) divide_by_alpha(to, width);
     };
-    for (std::int32_t y = 0; y < layout_.height(); ++y) {
+    const std::int32_t height = layout_.height();
+    for (std::int32_t y = 0; y < height; ++y) {
         std::array<SampleRow, 3> rgb;
-        for (std::size_t i = 0; i < rgb.size(); ++i)
-            rgb[i] = i < rows ? row_of(layout_.colours[i], y, wide[i]) : rgb[0];
+        for (std::size_t i = 0; i < rgb.size(); ++i) rgb[i] = i < rows ? colours[i].row(y) : rgb[0];
         if (layout_.is_ycc && rows == 3) ycc_to_rgb_samples(rgb, width, bits);
         for (std::size_t i = 0; i < rows; ++i) spread_samples(rgb[i], width, bits, wanted);
-        const SampleRow opacity = alpha ? row_of(layout_.alpha, y, wide[3]) : nullptr;
-        if (alpha)
-            spread_samples(opacity, width, layout_.stream.components[layout_.alpha].bits, wanted);
+        const SampleRow opacity = opacities ? opacities->row(y) : nullptr;
+        if (opacities) spread_samples(opacity, width, alpha_bits, wanted);
         if (wanted == 8) {
             finish(image.row(y), rgb, opacity);
         } else {

@@ -2,7 +2,6 @@
 #pragma once
 
 #include <optional>
-#include <vector>
 
 #include "files/jpeg2000_layout.h"
 #include "files/jpeg2000_rows.h"
@@ -26,7 +25,6 @@ class Jpeg2000Reader {
   private:
     void decode();
     void check_component(std::size_t index) const;
-    SampleRow row_of(std::size_t index, std::int32_t y, std::vector<std::int32_t>& wide) const;
     void read_grey(Image& image) const;
     void read_colour(Image& image) const;
 
