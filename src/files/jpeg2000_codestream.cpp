@@ -120,7 +120,7 @@ class Walk {
         if (layers > 1) throw kMoreThanOneLayer;
         content.u8();  // transformation of components
         for (const Jpeg2000Component& component : stream_.components)
-            check_precincts(content, component, style, is_main);
+            check_divisions(content, component, style, is_main);
         has_style_ = has_style_ || is_main;
     }
 
@@ -129,30 +129,48 @@ class Walk {
         const std::size_t index = content.u8();
         require_header(index < count);
         const std::uint8_t style = content.u8();
-        check_precincts(content, stream_.components[index], style, is_main);
+        check_divisions(content, stream_.components[index], style, is_main);
     }
 
     // Each precinct has a packet and each packet a byte, while OpenJPEG takes hundreds of bytes for
-    // a precinct. Counts those that lie wholly inside, of the whole picture or of one tile.
-    void check_precincts(Jpeg2000Fields content, const Jpeg2000Component& component,
+    // a precinct, and for a code block. Counts the precincts that lie wholly inside, and all
+    // blocks, of the whole picture or of one tile.
+    void check_divisions(Jpeg2000Fields content, const Jpeg2000Component& component,
                          std::uint8_t style, bool is_main) const {
-        constexpr std::uint8_t kOwnPrecincts = 1;
+        constexpr std::uint8_t kOwnPrecincts = 1, kOnePrecinct = 0xFF;
         constexpr unsigned kMostLevels = 32;
         const unsigned levels = content.u8();
         require_header(levels <= kMostLevels);
-        content.u32();  // size and style of code blocks, wavelet
-        if ((style & kOwnPrecincts) == 0) return;
+        const unsigned block_width = (content.u8() & 15U) + 2, block_height = content.u8() % 16 + 2;
+        content.u16();  // style of code blocks, wavelet
         std::uint64_t width = stream_.width(component), height = stream_.height(component);
         if (!is_main) {
             width = std::min<std::uint64_t>(width, stream_.grid.tile_width / component.dx);
             height = std::min<std::uint64_t>(height, stream_.grid.tile_height / component.dy);
         }
-        std::uint64_t packets = 0;
+        std::uint64_t packets = 0, blocks = 0;
         for (unsigned resolution = 0; resolution <= levels; ++resolution) {
-            const unsigned size = content.u8(), down = levels - resolution;
-            packets += (width >> down >> (size & 15U)) * (height >> down >> (size >> 4U));
-            if (packets > most_bytes_) throw kUnableToReadData;
+            const bool own = (style & kOwnPrecincts) != 0;
+            const unsigned size = own ? content.u8() : kOnePrecinct, down = levels - resolution;
+            const unsigned column = size & 15U, line = size >> 4U;
+            if (own) packets += (width >> down >> column) * (height >> down >> line);
+            // Above the lowest resolution three bands share a precinct, and are half as large.
+            const unsigned half = resolution == 0 ? 0 : 1, bands = resolution == 0 ? 1 : 3;
+            const auto count = [down, half](std::uint64_t side, unsigned block, unsigned precinct) {
+                const unsigned inside = std::max(precinct, half) - half;
+                return (side >> (down + half) >> std::min(block, inside)) + 1;
+            };
+            blocks += bands * count(width, block_width, column) * count(height, block_height, line);
+            if (packets > most_bytes_ || blocks > most_blocks(width * height))
+                throw kUnableToReadData;
         }
+    }
+
+    // A block that nothing is told of takes hardly a bit, so bytes bound the small ones only, which
+    // take more memory than their samples.
+    std::uint64_t most_blocks(std::uint64_t samples) const {
+        constexpr std::uint64_t kFree = std::uint64_t{1} << 15, kByByte = 8, kLargeArea = 64;
+        return samples / kLargeArea + (kFree + kByByte * most_bytes_) / stream_.components.size();
     }
 
     // Up to the end of the code stream.

@@ -382,6 +382,9 @@ TEST_F(Jpeg2000ReadTest, RefusesWhatAFileCannotHold) {
     EXPECT_EQ(read(divided("\xFF\xFF\xFF", 0), picture), 0);
     for (const char* sizes : {"\x11\x11\x11", "\x11\xFF\xFF", "\xFF\xFF\x31"})
         EXPECT_EQ(read(divided(sizes, 4000), picture), kUnreadable);
+    BareJpeg2000 honest{.width = 1000, .height = 1000, .components = {{}}};
+    honest.block = 4;
+    EXPECT_EQ(read(honest.encode(), picture), 0);
 }
 
 TEST_F(Jpeg2000ReadTest, SurvivesTruncationAndDamage) {

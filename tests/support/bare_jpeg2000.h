@@ -25,6 +25,7 @@ struct BareJpeg2000 {
     std::vector<Component> components{};
     int tile = 0;  // side; 0: one tile
     int resolutions = 3;
+    int block = 64;  // side of code blocks
     int layers = 1;
     bool wavelet_float = false;
     char mct = 0;
@@ -82,6 +83,7 @@ struct BareJpeg2000 {
             parameters.tcp_rates[i] = static_cast<float>(4 * (layers - i));
         parameters.cp_disto_alloc = 1;
         parameters.numresolution = resolutions;
+        parameters.cblockw_init = parameters.cblockh_init = block;
         parameters.irreversible = wavelet_float ? 1 : 0;
         parameters.tcp_mct = mct;
         if (tile != 0) {
