@@ -86,15 +86,18 @@ std::size_t TiffStream::read(void* bytes, std::size_t count) noexcept {
     return came;
 }
 
+// libtiff does not look at what every seek and write came to.
 std::size_t TiffStream::write(const void* bytes, std::size_t count) noexcept {
-    if (output == nullptr) return 0;
-    if (!(bytes == rows.first ? take_rows() : write_bytes(bytes, count))) return 0;
+    has_failed = has_failed || !put(bytes, count);
+    if (has_failed) return 0;
     position += count;
     size = std::max(size, position);
     return count;
 }
 
-bool TiffStream::write_bytes(const void* bytes, std::size_t count) noexcept {
+bool TiffStream::put(const void* bytes, std::size_t count) noexcept {
+    if (output == nullptr) return false;
+    if (bytes == rows.first) return take_rows();
     if (!write_waiting()) return false;
     if (is_behind_rows && !move_to(position)) return false;
     return output->try_write(bytes, count);
@@ -114,11 +117,12 @@ bool TiffStream::take_rows() noexcept {
 }
 
 bool TiffStream::write_waiting() noexcept {
-    if (waiting.count == 0) return true;
-    const bool done = output != nullptr && output->try_write_rows(waiting);
-    is_behind_rows = true;
-    waiting = {};
-    return done;
+    if (waiting.count > 0) {
+        has_failed = has_failed || output == nullptr || !output->try_write_rows(waiting);
+        is_behind_rows = true;
+        waiting = {};
+    }
+    return !has_failed;
 }
 
 TiffSession::TiffSession(InputFile& file) {
@@ -168,6 +172,10 @@ bool TiffSession::write_strip(std::uint32_t strip,
         TIFFWriteRawStrip(tiff_, strip, const_cast<std::uint8_t*>(rows.first), bytes) == bytes;
     stream_.rows = {};
     return done;
+}
+
+bool TiffSession::write_directory() noexcept {
+    return stream_.write_waiting() && TIFFWriteDirectory(tiff_) == 1 && !stream_.has_failed;
 }
 
 void TiffSession::swap_samples(std::span<std::uint8_t> bytes, int bits) const {

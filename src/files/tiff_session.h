@@ -25,16 +25,20 @@ struct TiffStream {
     // less cost. They end at `position`.
     platform::Rows<const std::uint8_t> waiting{};
     bool is_behind_rows = false;  // the file has to seek before it can go on
+    bool has_failed = false;      // a write; then so does all that comes after it
 
     bool seek(std::uint64_t offset) noexcept;
     std::size_t read(void* bytes, std::size_t count) noexcept;
     std::size_t write(const void* bytes, std::size_t count) noexcept;
 
+    // Of rows that write() took.
+    bool write_waiting() noexcept;
+
   private:
     bool move_to(std::uint64_t offset) noexcept;
     bool write_bytes(const void* bytes, std::size_t count) noexcept;
     bool take_rows() noexcept;
-    bool write_waiting() noexcept;
+    bool put(const void* bytes, std::size_t count) noexcept;
 };
 
 class TiffSession {
@@ -58,6 +62,8 @@ class TiffSession {
     // latest with the directory, and must stay until then. False on a failure, also of a strip
     // before.
     bool write_strip(std::uint32_t strip, platform::Rows<const std::uint8_t> rows) noexcept;
+    // False unless all strips and the directory are in the file's stream.
+    bool write_directory() noexcept;
     // Samples of the file itself, of so many bits, into the machine's byte order.
     void swap_samples(std::span<std::uint8_t> bytes, int bits) const;
 

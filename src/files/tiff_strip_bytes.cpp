@@ -11,12 +11,19 @@ namespace {
 
 constexpr std::size_t kPieceBytes = std::size_t{16} << 10;
 
+// Files announce more than they have, and still have all that the pixels need.
+std::uint64_t bytes_in_file(const TiffSession& session, std::uint64_t position,
+                            std::uint64_t announced) {
+    const std::uint64_t size = session.file_size();
+    return std::min(announced, size - std::min(position, size));
+}
+
 }  // namespace
 
 TiffStripBytes::TiffStripBytes(TiffSession& session, std::uint32_t strip)
     : session_(session),
       position_(TIFFGetStrileOffset(session.tiff(), strip)),
-      left_(TIFFGetStrileByteCount(session.tiff(), strip)),
+      left_(bytes_in_file(session, position_, TIFFGetStrileByteCount(session.tiff(), strip))),
       bytes_(std::make_unique_for_overwrite<std::uint8_t[]>(kPieceBytes)) {
     if (position_ == 0) throw kUnableToReadData;
 }

@@ -250,7 +250,7 @@ void TiffWriter::write_rows() {
 }
 
 void TiffWriter::write_end() {
-    require(TIFFWriteDirectory(session_.tiff()) == 1);
+    require(session_.write_directory());
 }
 
 }  // namespace zq

@@ -7,7 +7,8 @@
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
-#include <vector>
+#include <memory>
+#include <new>
 
 namespace zq::platform {
 namespace {
@@ -55,18 +56,33 @@ Rows<Byte> joined(Rows<Byte> rows) {
     return {rows.first, rows.stride, rows.row_bytes * rows.count, 1};
 }
 
-std::vector<std::uint8_t> make_block(std::size_t row_bytes) {
-    return std::vector<std::uint8_t>(std::max(kBlockBytes, row_bytes));
+// Calls `move` for every row, in order.
+template <class Byte, class Move>
+bool for_each_row(const Rows<Byte>& rows, Move move) {
+    for (std::size_t row = 0; row < rows.count; ++row) {
+        if (!move(rows.first + static_cast<std::ptrdiff_t>(row) * rows.stride)) return false;
+    }
+    return true;
+}
+
+// None where rows are long enough to go one by one, or have to for lack of memory.
+std::unique_ptr<std::uint8_t[]> make_block(std::size_t row_bytes, std::size_t rows) {
+    const bool useful = rows > 1 && row_bytes < kBlockBytes;
+    return std::unique_ptr<std::uint8_t[]>(useful ? new (std::nothrow) std::uint8_t[kBlockBytes]
+                                                  : nullptr);
 }
 
 bool read_joined(int file, const Rows<std::uint8_t>& rows) {
-    if (rows.row_bytes == 0 || rows.count == 0) return true;
-    if (rows.count == 1) return read_all(file, rows.first, rows.row_bytes);
-    std::vector<std::uint8_t> block = make_block(rows.row_bytes);
+    if (rows.row_bytes == 0) return true;
+    const std::unique_ptr<std::uint8_t[]> block = make_block(rows.row_bytes, rows.count);
+    if (!block) {
+        return for_each_row(rows,
+                            [&](std::uint8_t* row) { return read_all(file, row, rows.row_bytes); });
+    }
     return for_each_block(rows, [&](std::uint8_t* first, std::size_t count) {
-        if (!read_all(file, block.data(), count * rows.row_bytes)) return false;
+        if (!read_all(file, block.get(), count * rows.row_bytes)) return false;
         for (std::size_t i = 0; i < count; ++i, first += rows.stride) {
-            std::memcpy(first, block.data() + i * rows.row_bytes, rows.row_bytes);
+            std::memcpy(first, block.get() + i * rows.row_bytes, rows.row_bytes);
         }
         return true;
     });
@@ -90,14 +106,17 @@ bool write_rows(std::FILE* stream, Rows<const std::uint8_t> given) {
     const Rows<const std::uint8_t> rows = joined(given);
     const int file = _fileno(stream);
     if (std::fflush(stream) != 0) return false;
-    if (rows.row_bytes == 0 || rows.count == 0) return true;
-    if (rows.count == 1) return write_all(file, rows.first, rows.row_bytes);
-    std::vector<std::uint8_t> block = make_block(rows.row_bytes);
+    if (rows.row_bytes == 0) return true;
+    const std::unique_ptr<std::uint8_t[]> block = make_block(rows.row_bytes, rows.count);
+    if (!block) {
+        return for_each_row(
+            rows, [&](const std::uint8_t* row) { return write_all(file, row, rows.row_bytes); });
+    }
     return for_each_block(rows, [&](const std::uint8_t* first, std::size_t count) {
         for (std::size_t i = 0; i < count; ++i, first += rows.stride) {
-            std::memcpy(block.data() + i * rows.row_bytes, first, rows.row_bytes);
+            std::memcpy(block.get() + i * rows.row_bytes, first, rows.row_bytes);
         }
-        return write_all(file, block.data(), count * rows.row_bytes);
+        return write_all(file, block.get(), count * rows.row_bytes);
     });
 }
 
