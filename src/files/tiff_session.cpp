@@ -72,7 +72,10 @@ bool TiffStream::move_to(std::uint64_t offset) noexcept {
     const bool done = input != nullptr    ? input->try_seek(offset)
                       : output != nullptr ? output->try_seek(offset)
                                           : false;
-    if (!done) return false;
+    if (!done) {
+        has_failed = has_failed || output != nullptr;
+        return false;
+    }
     position = offset;
     is_behind_rows = false;
     return true;

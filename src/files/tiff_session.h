@@ -25,7 +25,7 @@ struct TiffStream {
     // less cost. They end at `position`.
     platform::Rows<const std::uint8_t> waiting{};
     bool is_behind_rows = false;  // the file has to seek before it can go on
-    bool has_failed = false;      // a write; then so does all that comes after it
+    bool has_failed = false;      // writing; then so does all that comes after it
 
     bool seek(std::uint64_t offset) noexcept;
     std::size_t read(void* bytes, std::size_t count) noexcept;

@@ -219,6 +219,8 @@ TEST_F(TiffReadTest, DecodesWhatItsStripsHold) {
     ink_planes.strips = {"\xFF\0\x0A"s, "\0\0\x14"s, "\x80\0\x1E"s, "\0\xFF\x64"s};
     const BareTiff alpha = with_field(bare_tiff(4, 1, 2, {8, 8, 8, 8}), 338, {1});
     const BareTiff ycbcr = with_field(bare_tiff(2, 2, 6, {8, 8, 8}), 530, {2, 2});
+    BareTiff overstated = with_strip(grey, 32773, "\xFD\x61\3bcde");
+    overstated.fields[279] = {kTiffLong, {0x7FFFFFFF}};
     const Bytes ink_pixels = "\x7F\xFF\0\0\0\0\0\0\x88\x8E\x94\0"s;
     struct Case {
         const char* name;
@@ -227,6 +229,7 @@ TEST_F(TiffReadTest, DecodesWhatItsStripsHold) {
     };
     const Case cases[] = {
         {"PackBits", with_strip(grey, 32773, "\xFD\x61\3bcde"), "aaaabcde"},
+        {"PackBits, more bytes announced than there are", overstated, "aaaabcde"},
         {"deflate", with_strip(grey, 8, deflated("abcdefgh")), "abcdefgh"},
         {"deflate, the old tag", with_strip(grey, 32946, deflated("abcdefgh")), "abcdefgh"},
         {"differences", with_field(with_strip(grey, 8, deflated("a\1\1\1b\0\0\0"s)), 317, {2}),
