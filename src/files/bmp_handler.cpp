@@ -63,7 +63,7 @@ void BmpFileHandler::seek_to_data() {
         input().require(bmp_.data_offset, checked_mul(bmp_.line_bytes(), height));
     }
     if (bmp_.data_offset > std::numeric_limits<std::int32_t>::max()) throw kUnableToReadData;
-    input().seek(static_cast<long>(bmp_.data_offset));
+    input().seek(bmp_.data_offset);
 }
 
 // A picture whose palette is the ramp of greys is a grey picture and has no table.

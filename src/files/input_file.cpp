@@ -32,13 +32,13 @@ void InputFile::rewind() {
     if (std::fseek(stream_.get(), 0, SEEK_SET) != 0) throw code_of_errno(errno);
 }
 
-void InputFile::seek(long offset) {
-    if (std::fseek(stream_.get(), offset, SEEK_SET) != 0) throw kUnableToReadData;
+void InputFile::seek(std::uint64_t offset) {
+    if (!try_seek(offset)) throw kUnableToReadData;
 }
 
 bool InputFile::try_seek(std::uint64_t offset) noexcept {
-    return std::in_range<long>(offset) &&
-           std::fseek(stream_.get(), static_cast<long>(offset), SEEK_SET) == 0;
+    return std::in_range<std::int64_t>(offset) &&
+           platform::seek_to(stream_.get(), static_cast<std::int64_t>(offset));
 }
 
 std::size_t InputFile::read_some(void* bytes, std::size_t count) noexcept {

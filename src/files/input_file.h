@@ -24,7 +24,7 @@ class InputFile {
     // Throws the mapped error number; a stream without positions (a pipe) cannot be probed.
     void rewind();
     // Offset from the start. Throws kUnableToReadData.
-    void seek(long offset);
+    void seek(std::uint64_t offset);
 
     // False where the stream has no such position.
     bool try_seek(std::uint64_t offset) noexcept;

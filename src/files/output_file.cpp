@@ -42,8 +42,8 @@ bool OutputFile::try_flush() noexcept {
 
 bool OutputFile::try_seek(std::uint64_t offset) noexcept {
     errno = 0;
-    if (std::in_range<long>(offset) &&
-        std::fseek(stream_.get(), static_cast<long>(offset), SEEK_SET) == 0) {
+    if (std::in_range<std::int64_t>(offset) &&
+        platform::seek_to(stream_.get(), static_cast<std::int64_t>(offset))) {
         return true;
     }
     last_error_ = code_of_errno(errno);

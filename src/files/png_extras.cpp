@@ -129,7 +129,7 @@ bool Walk::fits(std::uint32_t length) const {
 void Walk::skip(std::uint64_t count) {
     std::array<std::uint8_t, 4096> passed;
     if (count > kStreamBuffer) {
-        file_.seek(static_cast<long>(at_ + kChunkHead + count));
+        file_.seek(at_ + kChunkHead + count);
         return;
     }
     while (count > 0) {
@@ -214,7 +214,7 @@ bool Walk::keep(std::optional<PngText> text) {
 
 PngExtras read_png_extras(InputFile& file, PngVision* vision) {
     PngExtras extras = Walk(file, vision).run();
-    file.seek(static_cast<long>(kPngSignatureBytes));
+    file.seek(kPngSignatureBytes);
     return extras;
 }
 

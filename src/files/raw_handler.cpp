@@ -37,7 +37,7 @@ void RawFileHandler::seek_to_data() {
     const std::uint64_t bytes = checked_mul<std::uint64_t>(stride(), lines - 1);
     input().require(static_cast<std::uint64_t>(layout_.offset),
                     checked_add<std::uint64_t>(bytes, line_bytes()));
-    input().seek(layout_.offset);
+    input().seek(static_cast<std::uint64_t>(layout_.offset));
 }
 
 void RawFileHandler::read_lines(Image& image) {
@@ -74,8 +74,7 @@ void RawFileHandler::read_planes(Image& image) {
     const auto width = static_cast<std::size_t>(target_.width);
     std::vector<std::uint8_t> line(width);
     for (std::size_t channel = 0; channel < 3; ++channel) {
-        input().seek(checked_narrow<long>(static_cast<std::uint64_t>(layout_.offset) +
-                                          channel * plane_bytes()));
+        input().seek(static_cast<std::uint64_t>(layout_.offset) + channel * plane_bytes());
         for (std::int32_t y = 0; y < target_.height; ++y) {
             input().read(line.data(), width, kUnableToReadData);
             std::uint8_t* pixel = image.row(y);

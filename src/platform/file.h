@@ -18,6 +18,10 @@ std::int64_t regular_size(std::FILE* stream);
 // Where an open stream stands, in bytes from the start; -1 with errno set when it cannot tell.
 std::int64_t position_of(std::FILE* stream);
 
+// Moves an open stream to so many bytes from the start, also beyond the end and beyond what a long
+// holds. False with errno set.
+bool seek_to(std::FILE* stream, std::int64_t position);
+
 // What stands at a path now (symbolic links followed).
 enum class PathKind { kAbsent, kRegular, kOther };
 PathKind path_kind(const char* path);

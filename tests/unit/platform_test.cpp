@@ -286,6 +286,18 @@ TEST_F(PlatformFile, SizeOfAnOpenFileLeavesThePosition) {
     EXPECT_EQ(errno, ENOENT);
 }
 
+TEST_F(PlatformFile, StreamsSeekBeyondWhatALongHolds) {
+    constexpr std::int64_t kFar = std::int64_t{5} << 30;
+    const Stream stream(open_file(write("file", "0123456789").c_str(), "rb"), std::fclose);
+    ASSERT_NE(stream, nullptr);
+    EXPECT_TRUE(seek_to(stream.get(), kFar));
+    EXPECT_EQ(position_of(stream.get()), kFar);
+    EXPECT_EQ(std::fgetc(stream.get()), EOF);
+    EXPECT_TRUE(seek_to(stream.get(), 3));
+    EXPECT_EQ(std::fgetc(stream.get()), '3');
+    EXPECT_FALSE(seek_to(stream.get(), -1));
+}
+
 TEST_F(PlatformFile, RowsFromAnOffsetLeaveTheStreamWhereItIs) {
     const Stream stream(open_file(write("file", "0123456789").c_str(), "rb"), std::fclose);
     ASSERT_NE(stream, nullptr);

@@ -47,6 +47,10 @@ std::int64_t position_of(std::FILE* stream) {
     return ftello(stream);
 }
 
+bool seek_to(std::FILE* stream, std::int64_t position) {
+    return fseeko(stream, position, SEEK_SET) == 0;
+}
+
 PathKind path_kind(const char* path) {
     struct stat status {};
     if (stat(path, &status) != 0) return PathKind::kAbsent;

@@ -74,6 +74,10 @@ std::int64_t position_of(std::FILE* stream) {
     return _ftelli64(stream);
 }
 
+bool seek_to(std::FILE* stream, std::int64_t position) {
+    return _fseeki64(stream, position, SEEK_SET) == 0;
+}
+
 PathKind path_kind(const char* path) {
     const DWORD attributes = GetFileAttributesA(path);
     if (attributes == INVALID_FILE_ATTRIBUTES) return PathKind::kAbsent;
