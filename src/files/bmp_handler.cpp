@@ -2,7 +2,6 @@
 #include "files/bmp_handler.h"
 
 #include <algorithm>
-#include <limits>
 
 #include "base/checked.h"
 #include "files/bmp_rle.h"
@@ -62,7 +61,6 @@ void BmpFileHandler::seek_to_data() {
         const auto height = static_cast<std::uint64_t>(bmp_.height);
         input().require(bmp_.data_offset, checked_mul(bmp_.line_bytes(), height));
     }
-    if (bmp_.data_offset > std::numeric_limits<std::int32_t>::max()) throw kUnableToReadData;
     input().seek(bmp_.data_offset);
 }
 

@@ -1,4 +1,4 @@
-// A device that refuses bytes once: what libtiff is told of it, and for how long.
+// A device without room: what libtiff is told of it, and for how long.
 #include "files/tiff_session.h"
 
 #include <gtest/gtest.h>

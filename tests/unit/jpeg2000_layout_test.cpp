@@ -4,7 +4,8 @@
 #include <gtest/gtest.h>
 
 #include <bit>
-#include <optional>
+#include <string>
+#include <vector>
 
 #include "support/bare_jpeg2000.h"
 #include "support/scratch_folder.h"
